@@ -1,0 +1,50 @@
+# Build settings shared by every target of the project.
+
+# Warnings as errors on our own code, for every compiler we build with.
+function(hv_warnings target)
+  target_compile_options(${target} PRIVATE -Wall -Wextra -Werror -Wshadow -Wno-missing-field-initializers)
+endfunction()
+
+if(HV_SANITIZE)
+  add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  add_link_options(-fsanitize=address,undefined)
+endif()
+
+if(WIN32)
+  add_compile_definitions(UNICODE _UNICODE WIN32_LEAN_AND_MEAN)
+  # Windows programs link the runtime statically, so they import only system libraries.
+  add_link_options(-static -static-libgcc -static-libstdc++)
+endif()
+
+# The resource compiler; the Linux builds use it too, to compile the same .rc that ships.
+if(NOT HV_WINDRES)
+  if(CMAKE_RC_COMPILER)
+    set(HV_WINDRES ${CMAKE_RC_COMPILER})
+  else()
+    find_program(HV_WINDRES NAMES x86_64-w64-mingw32-windres i686-w64-mingw32-windres windres)
+  endif()
+endif()
+if(NOT HV_WINDRES)
+  message(FATAL_ERROR "No resource compiler (windres) found: install binutils-mingw-w64 (tools/setup.sh)")
+endif()
+
+# The Python that has Debian's pefile module (another python3 may come first on PATH).
+find_program(HV_PYTHON NAMES python3 PATHS /usr/bin NO_DEFAULT_PATH)
+if(NOT HV_PYTHON)
+  find_program(HV_PYTHON NAMES python3 REQUIRED)
+endif()
+
+# Which builds can run their own programs here: the i686 DLL is checked statically only.
+set(HV_CAN_RUN ON)
+if(WIN32 AND CMAKE_SIZEOF_VOID_P EQUAL 4)
+  set(HV_CAN_RUN OFF)
+endif()
+
+# Windows programs of the 64-bit build run under Wine, headless, one prefix per build tree.
+if(WIN32 AND HV_CAN_RUN)
+  set(HV_WINE_PREFIX ${CMAKE_BINARY_DIR}/wine-prefix)
+  configure_file(${CMAKE_SOURCE_DIR}/tools/wine-run.in ${CMAKE_BINARY_DIR}/wine-run @ONLY
+                 FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE
+                                  WORLD_READ WORLD_EXECUTE)
+  set(CMAKE_CROSSCOMPILING_EMULATOR ${CMAKE_BINARY_DIR}/wine-run)
+endif()

@@ -1,0 +1,82 @@
+#include "key_selection.h"
+
+#include <stdlib.h>
+#include <string.h>
+#include <wchar.h>
+
+#include "error_state.h"
+#include "host_services.h"
+#include "routines.h"
+
+const RootKey RootKeyTable[RootKeyCount + 1] = {
+    {TEXT("HKEY_CLASSES_ROOT"), HKEY_CLASSES_ROOT},
+    {TEXT("HKEY_LOCAL_MACHINE"), HKEY_LOCAL_MACHINE},
+    {TEXT("HKEY_CURRENT_USER"), HKEY_CURRENT_USER},
+    {TEXT("HKEY_CURRENT_CONFIG"), HKEY_CURRENT_CONFIG},
+    {TEXT("HKEY_USERS"), HKEY_USERS},
+    {nullptr, nullptr},
+};
+
+DWORD RootIndexOf(const RootKeyParam* param) {
+    const BYTE* b = param->rootIndex;
+    return static_cast<DWORD>(b[0]) | static_cast<DWORD>(b[1]) << 8 |
+           static_cast<DWORD>(b[2]) << 16 | static_cast<DWORD>(b[3]) << 24;
+}
+
+DWORD RootKeyByName(const WCHAR* name) {
+    DWORD index = 0;
+    for (; RootKeyTable[index].name; ++index)
+        if (_wcsicmp(name, RootKeyTable[index].name) == 0) break;
+    return index;
+}
+
+static REGSAM WithView(const RunObjectData* instance, REGSAM access) {
+    return instance->use64BitView ? access | KEY_WOW64_64KEY : access;
+}
+
+REGSAM ReadAccess(const RunObjectData* instance) { return WithView(instance, KEY_READ); }
+
+REGSAM WriteAccess(const RunObjectData* instance) { return WithView(instance, KEY_ALL_ACCESS); }
+
+short WINAPI ActSetRootKey(RunObjectData* instance, HostValue param, HostValue) {
+    instance->lastError = ERR_INVALID_PARAMETERS;
+    const auto* record = reinterpret_cast<const RootKeyParam*>(param);
+    if (!record) return 0;
+    DWORD index = RootIndexOf(record);
+    if (index >= RootKeyCount) return 0;
+    instance->lastError = ERROR_SUCCESS;
+    instance->rootKeyIndex = index;
+    return 0;
+}
+
+// The copy is made before the old key is freed, so the text of ExpGetCurrentKey can come back.
+// When no copy can be had the old key stays and the failure is reported, not hidden.
+short WINAPI ActSetCurrentKey(RunObjectData* instance, HostValue param, HostValue) {
+    instance->lastError = ERR_INVALID_PARAMETERS;
+    const auto* text = reinterpret_cast<const WCHAR*>(param);
+    if (!text) return 0;
+    auto* copy = static_cast<WCHAR*>(calloc(wcslen(text) + 1, sizeof(WCHAR)));
+    if (!copy) {
+        instance->lastError = ERROR_NOT_ENOUGH_MEMORY;
+        return 0;
+    }
+    wcscpy(copy, text);
+    free(instance->currentKey);
+    instance->currentKey = copy;
+    instance->lastError = ERROR_SUCCESS;
+    return 0;
+}
+
+short WINAPI ActSet64BitMode(RunObjectData* instance, HostValue param, HostValue) {
+    instance->use64BitView = static_cast<DWORD>(param) != 0 ? 1 : 0;
+    return 0;
+}
+
+HostValue WINAPI ExpGetCurrentRootKey(RunObjectData* instance, HostValue) {
+    DWORD index = instance->rootKeyIndex;
+    return TextResult(instance, index < RootKeyCount ? RootKeyTable[index].name : EmptyString);
+}
+
+HostValue WINAPI ExpGetCurrentKey(RunObjectData* instance, HostValue) {
+    return TextResult(instance, instance->currentKey ? instance->currentKey : EmptyString);
+}

@@ -1,0 +1,77 @@
+// The run-time lifecycle of an instance and the routine tables handed to the host.
+#include <stdlib.h>
+
+#include "host_services.h"
+#include "routines.h"
+
+namespace {
+
+const ConditionRoutine ConditionRoutines[] = {
+    CndKeyExists, CndValueExists, CndCurrentKeyExists, CndCurrentValueExists,
+    CndLastActionSuccessful, nullptr,
+};
+
+const ActionRoutine ActionRoutines[] = {
+    ActSetRootKey,       ActSetCurrentKey,      ActSetCurrentDword, ActSetCurrentString,
+    ActSetDword,         ActSetString,          ActDeleteCurrentKey, ActDeleteCurrentValue,
+    ActDeleteKey,        ActDeleteValue,        ActCreateCurrentKey, ActCreateKey,
+    ActSet64BitMode,     nullptr,
+};
+
+const ExpressionRoutine ExpressionRoutines[] = {
+    ExpGetCurrentRootKey, ExpGetCurrentKey, ExpGetCurrentDword, ExpGetCurrentString,
+    ExpGetDword,          ExpGetString,     ExpLastErrorCode,   ExpLastErrorMessage,
+    nullptr,
+};
+
+// The four-character code HVLT, first character in the most significant byte.
+const DWORD ObjectIdentifier = 'H' << 24 | 'V' << 16 | 'L' << 8 | 'T';
+
+}  // namespace
+
+HV_EXPORT short WINAPI GetRunObjectDataSize(HostValue, HostValue) {
+    return sizeof(RunObjectData);
+}
+
+HV_EXPORT short WINAPI CreateRunObject(RunObjectData* instance, HostValue, HostValue) {
+    instance->rootKeyIndex = 0;
+    instance->currentKey = nullptr;
+    instance->lastError = ERROR_SUCCESS;
+    instance->use64BitView = 0;
+    return 0;
+}
+
+HV_EXPORT short WINAPI DestroyRunObject(RunObjectData* instance, HostValue) {
+    if (instance->currentKey) {
+        free(instance->currentKey);
+        instance->currentKey = nullptr;
+    }
+    return 0;
+}
+
+HV_EXPORT short WINAPI HandleRunObject(RunObjectData*) { return 1; }
+
+// Pausing, continuing and displaying need nothing from this object: one routine answers all.
+HV_EXPORT short WINAPI IdleRunObject(RunObjectData*) { return 0; }
+#ifndef _WIN32  // Hivelet.def gives the Windows builds the three names
+HV_EXPORT short WINAPI PauseRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
+HV_EXPORT short WINAPI ContinueRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
+HV_EXPORT short WINAPI DisplayRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
+#endif
+
+// Writes every field of the block but the one byte that belongs to the host.
+HV_EXPORT short WINAPI GetRunObjectInfos(HostValue, RunObjectInfos* infos) {
+    infos->conditions = ConditionRoutines;
+    infos->actions = ActionRoutines;
+    infos->expressions = ExpressionRoutines;
+    infos->conditionCount = sizeof(ConditionRoutines) / sizeof(ConditionRoutines[0]) - 1;
+    infos->actionCount = sizeof(ActionRoutines) / sizeof(ActionRoutines[0]) - 1;
+    infos->expressionCount = sizeof(ExpressionRoutines) / sizeof(ExpressionRoutines[0]) - 1;
+    infos->reserved20 = 20;
+    infos->reserved0 = 0;
+    infos->reserved100 = 100;
+    infos->reserved0b = 0;
+    infos->identifier = ObjectIdentifier;
+    infos->reserved1 = 1;
+    return 1;
+}

@@ -1,0 +1,173 @@
+// Portable Win32 layer: the subset of <windows.h> that the module and the host simulator use,
+// for Linux builds. Names, signatures, constants and results follow Windows. Text is UTF-16:
+// WCHAR is char16_t here, so the C library's wcs* functions never see it; the wide-string
+// functions below are overloads on char16_t.
+#pragma once
+
+#include <stddef.h>
+#include <stdint.h>
+#include <stdlib.h>
+#include <string.h>
+#include <wchar.h>
+
+#if defined(__i386__)
+#define WINAPI __attribute__((stdcall))
+#else
+#define WINAPI
+#endif
+#define CALLBACK WINAPI
+#define APIENTRY WINAPI
+
+#define W32_API extern "C" __attribute__((visibility("default")))
+
+#ifndef TEXT
+#define TEXT(quote) u##quote
+#endif
+
+typedef int BOOL;
+typedef unsigned char BYTE;
+typedef uint16_t WORD;
+typedef uint32_t DWORD;
+typedef int32_t LONG;
+typedef uint32_t ULONG;
+typedef int INT;
+typedef unsigned int UINT;
+typedef char16_t WCHAR;
+typedef WCHAR* LPWSTR;
+typedef const WCHAR* LPCWSTR;
+typedef char CHAR;
+typedef const char* LPCSTR;
+typedef void* LPVOID;
+typedef const void* LPCVOID;
+typedef intptr_t INT_PTR;
+typedef uintptr_t UINT_PTR;
+typedef intptr_t LONG_PTR;
+typedef uintptr_t ULONG_PTR;
+typedef uintptr_t DWORD_PTR;
+typedef ULONG_PTR SIZE_T;
+typedef LONG LSTATUS;
+typedef DWORD REGSAM;
+typedef DWORD* LPDWORD;
+typedef BYTE* LPBYTE;
+typedef UINT_PTR WPARAM;
+typedef LONG_PTR LPARAM;
+typedef LONG_PTR LRESULT;
+typedef void* HANDLE;
+typedef INT_PTR(WINAPI* FARPROC)();
+
+struct HINSTANCE__;
+typedef HINSTANCE__* HINSTANCE;
+typedef HINSTANCE HMODULE;
+struct HKEY__;
+typedef HKEY__* HKEY;
+typedef HKEY* PHKEY;
+struct HWND__;
+typedef HWND__* HWND;
+struct HMENU__;
+typedef HMENU__* HMENU;
+
+#define TRUE 1
+#define FALSE 0
+#define MAKEINTRESOURCEW(i) ((LPWSTR)(ULONG_PTR)(WORD)(i))
+#define LOWORD(l) ((WORD)(((DWORD_PTR)(l)) & 0xffff))
+#define HIWORD(l) ((WORD)((((DWORD_PTR)(l)) >> 16) & 0xffff))
+
+// Library entry reasons.
+#define DLL_PROCESS_DETACH 0
+#define DLL_PROCESS_ATTACH 1
+#define DLL_THREAD_ATTACH 2
+#define DLL_THREAD_DETACH 3
+
+// System error codes the module and the layer use.
+#define ERROR_SUCCESS 0L
+#define NO_ERROR 0L
+#define ERROR_FILE_NOT_FOUND 2L
+#define ERROR_PATH_NOT_FOUND 3L
+#define ERROR_ACCESS_DENIED 5L
+#define ERROR_INVALID_HANDLE 6L
+#define ERROR_NOT_ENOUGH_MEMORY 8L
+#define ERROR_OUTOFMEMORY 14L
+#define ERROR_INVALID_PARAMETER 87L
+#define ERROR_INSUFFICIENT_BUFFER 122L
+#define ERROR_MOD_NOT_FOUND 126L
+#define ERROR_PROC_NOT_FOUND 127L
+#define ERROR_BAD_PATHNAME 161L
+#define ERROR_MORE_DATA 234L
+#define ERROR_NO_MORE_ITEMS 259L
+#define ERROR_MR_MID_NOT_FOUND 317L
+#define ERROR_NOACCESS 998L
+#define ERROR_BADKEY 1010L
+#define ERROR_KEY_DELETED 1018L
+#define ERROR_RESOURCE_DATA_NOT_FOUND 1812L
+#define ERROR_RESOURCE_TYPE_NOT_FOUND 1813L
+#define ERROR_RESOURCE_NAME_NOT_FOUND 1814L
+
+// FormatMessage flags.
+#define FORMAT_MESSAGE_ALLOCATE_BUFFER 0x00000100
+#define FORMAT_MESSAGE_IGNORE_INSERTS 0x00000200
+#define FORMAT_MESSAGE_FROM_STRING 0x00000400
+#define FORMAT_MESSAGE_FROM_HMODULE 0x00000800
+#define FORMAT_MESSAGE_FROM_SYSTEM 0x00001000
+#define FORMAT_MESSAGE_ARGUMENT_ARRAY 0x00002000
+#define FORMAT_MESSAGE_MAX_WIDTH_MASK 0x000000FF
+
+// Registry roots and access rights (sign-extended on 64-bit, as on Windows).
+#define HKEY_CLASSES_ROOT ((HKEY)(ULONG_PTR)((LONG)0x80000000))
+#define HKEY_CURRENT_USER ((HKEY)(ULONG_PTR)((LONG)0x80000001))
+#define HKEY_LOCAL_MACHINE ((HKEY)(ULONG_PTR)((LONG)0x80000002))
+#define HKEY_USERS ((HKEY)(ULONG_PTR)((LONG)0x80000003))
+#define HKEY_CURRENT_CONFIG ((HKEY)(ULONG_PTR)((LONG)0x80000005))
+#define KEY_QUERY_VALUE 0x0001
+#define KEY_SET_VALUE 0x0002
+#define KEY_CREATE_SUB_KEY 0x0004
+#define KEY_ENUMERATE_SUB_KEYS 0x0008
+#define KEY_NOTIFY 0x0010
+#define KEY_CREATE_LINK 0x0020
+#define KEY_WOW64_64KEY 0x0100
+#define KEY_WOW64_32KEY 0x0200
+#define DELETE 0x00010000L
+#define READ_CONTROL 0x00020000L
+#define KEY_READ 0x20019
+#define KEY_WRITE 0x20006
+#define KEY_ALL_ACCESS 0xF003F
+#define REG_NONE 0
+#define REG_SZ 1
+#define REG_EXPAND_SZ 2
+#define REG_BINARY 3
+#define REG_DWORD 4
+#define REG_MULTI_SZ 7
+#define REG_QWORD 11
+
+// Kernel: last error, libraries.
+W32_API DWORD WINAPI GetLastError(void);
+W32_API void WINAPI SetLastError(DWORD code);
+W32_API HMODULE WINAPI LoadLibraryW(LPCWSTR fileName);
+W32_API FARPROC WINAPI GetProcAddress(HMODULE module, LPCSTR procName);
+W32_API BOOL WINAPI FreeLibrary(HMODULE module);
+W32_API DWORD WINAPI FormatMessageW(DWORD flags, LPCVOID source, DWORD messageId,
+                                    DWORD languageId, LPWSTR buffer, DWORD size, void* arguments);
+
+// User: string resources.
+W32_API int WINAPI LoadStringW(HINSTANCE instance, UINT id, LPWSTR buffer, int bufferMax);
+
+// The module's calloc, malloc and free reach the layer through the linker (--wrap), so tests
+// can make allocation fail without the module's sources knowing.
+
+// Runtime-library wide-string functions on UTF-16 text.
+W32_API size_t w32_wcslen(const WCHAR* text);
+W32_API WCHAR* w32_wcscpy(WCHAR* dest, const WCHAR* src);
+W32_API WCHAR* w32_wcsncpy(WCHAR* dest, const WCHAR* src, size_t count);
+W32_API int w32_wcsicmp(const WCHAR* a, const WCHAR* b);
+inline size_t wcslen(const WCHAR* text) { return w32_wcslen(text); }
+inline WCHAR* wcscpy(WCHAR* dest, const WCHAR* src) { return w32_wcscpy(dest, src); }
+inline WCHAR* wcsncpy(WCHAR* dest, const WCHAR* src, size_t count) {
+    return w32_wcsncpy(dest, src, count);
+}
+inline int _wcsicmp(const WCHAR* a, const WCHAR* b) { return w32_wcsicmp(a, b); }
+
+typedef struct tagRECT {
+    LONG left;
+    LONG top;
+    LONG right;
+    LONG bottom;
+} RECT, *LPRECT;
