@@ -2,6 +2,7 @@
 // the dynamic loader. A library's resources are the compiled resource file that its build
 // embedded as the symbol W32ResourceSection; its entry function is its exported DllMain.
 #include "internal.h"
+#include "registry.h"
 #include "resources.h"
 
 #include <dlfcn.h>
@@ -141,6 +142,8 @@ FARPROC WINAPI GetProcAddress(HMODULE module, LPCSTR procName) {
         SetLastError(static_cast<DWORD>(*code));
     } else if (!lib || !procName) {
         SetLastError(ERROR_INVALID_HANDLE);
+    } else if (lib->system && w32::exportHidden(procName)) {
+        SetLastError(ERROR_PROC_NOT_FOUND);  // a test made the system library lack it
     } else if (!(symbol = dlsym(lib->dl, procName))) {
         SetLastError(ERROR_PROC_NOT_FOUND);
     }

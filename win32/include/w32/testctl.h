@@ -42,3 +42,38 @@ W32_TEST_API void clearFaults();
 W32_TEST_API size_t liveAllocations();
 
 }  // namespace w32test
+
+// ---- Registry test control -------------------------------------------------------------
+// Every registry call is journaled with its arguments in Windows' order, pointers as
+// addresses: RegOpenKeyExW {hKey, lpSubKey, ulOptions, samDesired, phkResult};
+// RegCreateKeyExW {hKey, lpSubKey, Reserved, lpClass, dwOptions, samDesired, lpSecurity-
+// Attributes, phkResult, lpdwDisposition}; RegQueryValueExW {hKey, lpValueName, lpReserved,
+// lpType, lpData, lpcbData}; RegSetValueExW {hKey, lpValueName, Reserved, dwType, lpData,
+// cbData}; RegDeleteKeyW {hKey, lpSubKey}; RegDeleteKeyExW {hKey, lpSubKey, samDesired,
+// Reserved}; RegDeleteValueW {hKey, lpValueName}; RegEnumKeyExW {hKey, dwIndex, lpName,
+// lpcchName, lpReserved, lpClass, lpcchClass, lpftLastWriteTime}; RegCloseKey {hKey};
+// GetVersionExW {lpVersionInformation}. failCall/failAlways with a registry function's name
+// make it return that code and change nothing (a failed open or create sets *phkResult NULL).
+namespace w32test {
+
+// An empty registry: the five roots, HKLM\SOFTWARE with Wow6432Node and Classes, and
+// HKCU\Software; every handle closed, no right denied. Also unhides every export and gives
+// GetVersionExW back its defaults. reset() calls it. HKEY_CLASSES_ROOT is a root of its own,
+// not an alias of HKLM\SOFTWARE\Classes; only HKLM\SOFTWARE has a 32-bit view.
+W32_TEST_API void resetRegistry();
+// Handles open now, predefined ones excluded.
+W32_TEST_API size_t openHandleCount();
+// Denies `rights` to everyone on the key at `path` below the predefined `root`, creating the
+// key if it is missing; the view bits of `rights` choose the view as in RegCreateKeyExW (none:
+// the 32-bit view). Replaces an earlier denial; 0 lifts it. Opening or creating the key with a
+// mask that asks a denied right gives 5; denied DELETE keeps it from being deleted, denied
+// KEY_CREATE_SUB_KEY from getting new subkeys.
+W32_TEST_API void denyAccess(HKEY root, std::u16string path, DWORD rights);
+// Makes GetProcAddress on the system libraries (advapi32 ...) find `name` or not.
+W32_TEST_API void hideExport(const char* name, bool hidden);
+// Makes GetVersionExW return 0 (last error 87) while `fail` is set.
+W32_TEST_API void setVersionFault(bool fail);
+// The dwPlatformId GetVersionExW reports; VER_PLATFORM_WIN32_NT (2) by default.
+W32_TEST_API void setPlatformId(DWORD id);
+
+}  // namespace w32test

@@ -1,0 +1,133 @@
+// Values: the bytes RegSetValueExW stores and what RegQueryValueExW writes back, or not.
+#include "registry_fixture.h"
+
+#include <cstring>
+
+namespace {
+
+class RegistryValues : public RegistryTest {
+protected:
+    void SetUp() override {
+        RegistryTest::SetUp();
+        key = create(kUser, u"Software\\Probe");
+        buffer.assign(64, kSentinel);
+    }
+    // Reads `name` into `buffer` with the given capacity.
+    LONG read(const WCHAR* name, DWORD capacity) {
+        size = capacity;
+        return RegQueryValueExW(key, name, nullptr, &type, buffer.data(), &size);
+    }
+    // Whether the buffer is untouched from byte `from` on.
+    ::testing::AssertionResult untouchedFrom(size_t from) {
+        for (size_t i = from; i < buffer.size(); ++i)
+            if (buffer[i] != kSentinel) return ::testing::AssertionFailure() << "byte " << i;
+        return ::testing::AssertionSuccess();
+    }
+    HKEY key = nullptr;
+    std::vector<BYTE> buffer;
+    DWORD type = 0, size = 0;
+};
+
+struct StoreCase {
+    DWORD type;
+    std::u16string source;  // the caller's characters, followed in memory by a NUL
+    DWORD cbData, stored;
+};
+void PrintTo(const StoreCase& c, std::ostream* os) {
+    *os << "type " << c.type << ", cbData " << c.cbData;
+}
+
+class RegistryStoredBytes : public RegistryValues,
+                            public ::testing::WithParamInterface<StoreCase> {};
+
+TEST_P(RegistryStoredBytes, SizeAndTypeAreKeptExactly) {
+    const StoreCase& c = GetParam();
+    auto* bytes = reinterpret_cast<const BYTE*>(c.source.c_str());
+    ASSERT_EQ(RegSetValueExW(key, u"v", 0, c.type, bytes, c.cbData), 0);
+    ASSERT_EQ(read(u"v", 64), 0);
+    EXPECT_EQ(type, c.type);
+    ASSERT_EQ(size, c.stored);
+    EXPECT_EQ(std::memcmp(buffer.data(), bytes, c.stored), 0);
+    EXPECT_TRUE(untouchedFrom(c.stored));  // no terminator added on the way out
+}
+
+// One WCHAR short while the caller's next character is NUL: Windows stores the terminator too.
+INSTANTIATE_TEST_SUITE_P(
+    Windows, RegistryStoredBytes,
+    ::testing::Values(StoreCase{REG_SZ, u"abc", 8, 8}, StoreCase{REG_SZ, u"abc", 6, 8},
+                      StoreCase{REG_EXPAND_SZ, u"abc", 6, 8},
+                      StoreCase{REG_MULTI_SZ, std::u16string(u"a\0b", 3), 6, 8},
+                      StoreCase{REG_SZ, u"abcd", 6, 6}, StoreCase{REG_BINARY, u"abc", 6, 6},
+                      StoreCase{REG_SZ, u"abc", 7, 7}, StoreCase{REG_SZ, u"abc", 1, 1},
+                      StoreCase{REG_SZ, u"abc", 0, 0},
+                      StoreCase{REG_SZ, std::u16string(u"ab\0cd\0", 6), 12, 12},
+                      StoreCase{REG_DWORD, u"abcd", 3, 3}, StoreCase{REG_DWORD, u"abcd", 8, 8},
+                      StoreCase{12345, u"ab", 4, 4}));
+
+struct BufferCase {
+    DWORD type, valueSize, capacity;
+    LONG expected;
+};
+void PrintTo(const BufferCase& c, std::ostream* os) {
+    *os << "type " << c.type << ", size " << c.valueSize << ", capacity " << c.capacity;
+}
+
+class RegistryQueryBuffer : public RegistryValues,
+                            public ::testing::WithParamInterface<BufferCase> {};
+
+// Too small a buffer gets 234, the full size and not one byte; a fitting one the data only.
+TEST_P(RegistryQueryBuffer, WritesAllOrNothing) {
+    const BufferCase& c = GetParam();
+    const char16_t hello[] = u"hello";
+    ASSERT_EQ(RegSetValueExW(key, u"v", 0, c.type, reinterpret_cast<const BYTE*>(hello),
+                             c.valueSize),
+              0);
+    EXPECT_EQ(read(u"v", c.capacity), c.expected);
+    EXPECT_EQ(size, c.valueSize);
+    EXPECT_EQ(type, c.type);
+    EXPECT_TRUE(untouchedFrom(c.expected == 0 ? c.valueSize : 0));
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Sizes, RegistryQueryBuffer,
+    ::testing::Values(BufferCase{REG_SZ, 12, 0, 234}, BufferCase{REG_SZ, 12, 4, 234},
+                      BufferCase{REG_SZ, 12, 11, 234}, BufferCase{REG_SZ, 12, 12, 0},
+                      BufferCase{REG_SZ, 0, 1, 0}, BufferCase{REG_DWORD, 4, 2, 234},
+                      BufferCase{REG_DWORD, 4, 0xFFFFFFFF, 0}));
+
+TEST_F(RegistryValues, MissingValueSetsSizeZeroOnlyWithoutABuffer) {
+    type = 77;
+    size = 50;
+    EXPECT_EQ(RegQueryValueExW(key, u"none", nullptr, &type, nullptr, &size), 2);
+    EXPECT_EQ(size, 0u);
+    EXPECT_EQ(type, 77u);
+    EXPECT_EQ(read(u"none", 8), 2);
+    EXPECT_EQ(size, 8u);
+    EXPECT_TRUE(untouchedFrom(0));
+    EXPECT_EQ(RegQueryValueExW(key, u"none", nullptr, nullptr, nullptr, nullptr), 2);
+}
+
+// "Keys do not automatically have an unnamed or default value"; "" and NULL both name it.
+TEST_F(RegistryValues, DefaultValueIsAbsentUntilWrittenAndNullMeansEmpty) {
+    for (const WCHAR* name : {static_cast<const WCHAR*>(nullptr), u""}) {
+        EXPECT_EQ(read(name, 64), 2);
+        EXPECT_EQ(RegDeleteValueW(key, name), 2);
+    }
+    ASSERT_EQ(setDword(key, nullptr, 7), 0);
+    EXPECT_EQ(read(u"", 64), 0);
+    EXPECT_EQ(type, DWORD(REG_DWORD));
+    EXPECT_EQ(RegDeleteValueW(key, u""), 0);
+    EXPECT_EQ(read(nullptr, 64), 2);
+}
+
+TEST_F(RegistryValues, AnotherTypeOverwritesUnderAnyCaseOfTheName) {
+    ASSERT_EQ(setDword(key, u"ValName", 1), 0);
+    const char16_t text[] = u"xy";
+    ASSERT_EQ(RegSetValueExW(key, u"VALNAME", 0, REG_SZ, reinterpret_cast<const BYTE*>(text), 6),
+              0);
+    EXPECT_EQ(read(u"valname", 64), 0);
+    EXPECT_EQ(type, DWORD(REG_SZ));
+    EXPECT_EQ(size, 6u);
+}
+
+}  // namespace

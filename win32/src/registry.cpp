@@ -1,0 +1,300 @@
+// The registry functions of advapi32, with Windows' results, over the in-memory model.
+#include "registry_model.h"
+
+#include <cstring>
+#include <new>
+
+using namespace w32::reg;
+
+namespace {
+
+bool isEmptyPath(const WCHAR* path) { return !path || !path[0]; }
+
+bool bothViews(REGSAM sam) { return (sam & kViewBits) == kViewBits; }
+
+std::u16string_view valueName(const WCHAR* name) {
+    return name ? std::u16string_view(name) : std::u16string_view();
+}
+
+// Runs one registry call: an injected fault answers first and touches nothing but the out
+// handle; otherwise the call runs under the registry's lock and running out of memory is a code.
+template <typename Body>
+LONG serve(std::string_view function, HKEY* outHandle, Body body) {
+    if (auto code = w32::takeFault(function)) {
+        if (outHandle) *outHandle = nullptr;
+        return static_cast<LONG>(*code);
+    }
+    Registry& r = registry();
+    std::lock_guard<std::mutex> guard(r.lock);
+    try {
+        return body(r);
+    } catch (const std::bad_alloc&) {
+        return ERROR_OUTOFMEMORY;
+    }
+}
+
+// A new handle to `key` if the key grants what `sam` asks for.
+LONG grant(Registry& r, Key& key, REGSAM sam, HKEY* out) {
+    DWORD rights = requestedRights(sam, key.denied);
+    if (rights & key.denied) return ERROR_ACCESS_DENIED;
+    *out = addHandle(r, key, rights);
+    return ERROR_SUCCESS;
+}
+
+// The checks open, create and delete make on the start key and the path, in Windows' order;
+// `names` receives the path's components.
+LONG startWalk(const Bound& start, const WCHAR* path, Names& names) {
+    if (LONG code = checkLeading(path, start)) return code;
+    if (start.key->deleted) return ERROR_KEY_DELETED;
+    return splitPath(path, names);
+}
+
+LONG openKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam, HKEY* out) {
+    if (!out || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    Bound start;
+    if (LONG code = bind(r, parent, start)) return code;  // *out untouched, as on Windows
+    // "" or NULL on a predefined root hands back the predefined value itself.
+    if (start.predefined && isEmptyPath(path)) {
+        *out = parent;
+        return ERROR_SUCCESS;
+    }
+    *out = nullptr;
+    Names names;
+    if (LONG code = startWalk(start, path, names)) return code;
+    Route way = route(r, *start.key, names, sam);
+    Key* key = findKey(*way.from, way.names);
+    if (!key) return ERROR_FILE_NOT_FOUND;
+    return grant(r, *key, sam, out);
+}
+
+LONG createKey(Registry& r, HKEY parent, const WCHAR* path, DWORD reserved, REGSAM sam,
+               HKEY* out, DWORD* disposition) {
+    // A NULL out pointer is 87 here as for RegOpenKeyExW (Windows' answer not recorded).
+    if (!out || reserved || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    Bound start;
+    if (LONG code = bind(r, parent, start)) return code;
+    *out = nullptr;
+    // A NULL path, documented as not allowed, names the key itself as "" does (Wine: 0).
+    Names names;
+    if (LONG code = startWalk(start, path, names)) return code;
+    Route way = route(r, *start.key, names, sam);
+    Key* key = nullptr;
+    bool created = false;
+    if (LONG code = createPath(*way.from, way.names, key, created)) return code;
+    if (LONG code = grant(r, *key, sam, out)) return code;
+    // For "" Windows' disposition is not recorded; the key existed, so it is 2.
+    if (disposition) *disposition = created ? REG_CREATED_NEW_KEY : REG_OPENED_EXISTING_KEY;
+    return ERROR_SUCCESS;
+}
+
+LONG deleteKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam) {
+    if (!path || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    Bound start;
+    if (LONG code = bind(r, parent, start)) return code;
+    Names names;
+    if (LONG code = startWalk(start, path, names)) return code;
+    // The parent handle's rights do not matter: Windows opens the subkey itself with DELETE.
+    Route way = route(r, *start.key, names, sam);
+    Key* key = findKey(*way.from, way.names);
+    return key ? removeKey(*key) : ERROR_FILE_NOT_FOUND;
+}
+
+// Windows adds the terminator a string value's size left out when the caller's next character
+// is one; it reads that character past cbData, as Windows does.
+DWORD storedSize(DWORD type, const BYTE* data, DWORD size) {
+    bool text = type == REG_SZ || type == REG_EXPAND_SZ || type == REG_MULTI_SZ;
+    if (!text || size < sizeof(WCHAR) || size % sizeof(WCHAR) != 0) return size;
+    WCHAR last = 0, next = 0;
+    std::memcpy(&last, data + size - sizeof(WCHAR), sizeof(WCHAR));
+    if (last == 0) return size;
+    std::memcpy(&next, data + size, sizeof(WCHAR));
+    return next == 0 ? size + static_cast<DWORD>(sizeof(WCHAR)) : size;
+}
+
+LONG setValue(Registry& r, HKEY handle, const WCHAR* name, DWORD type, const BYTE* data,
+              DWORD size) {
+    Bound at;
+    if (LONG code = bindFor(r, handle, KEY_SET_VALUE, at)) return code;
+    std::u16string_view label = valueName(name);
+    if (label.size() > kMaxValueNameLength) return ERROR_INVALID_PARAMETER;
+    if (!data && size) return ERROR_NOACCESS;
+    if (data) size = storedSize(type, data, size);
+    auto found = at.key->values.find(RawName{label});
+    if (found == at.key->values.end())  // a new value; an existing one keeps its first spelling
+        found = at.key->values.emplace(fold(label), Value{std::u16string(label)}).first;
+    Value& value = found->second;
+    value.type = type;
+    value.data.clear();
+    if (data) value.data.assign(data, data + size);
+    touch(*at.key);
+    return ERROR_SUCCESS;
+}
+
+LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* reserved, DWORD* type,
+                BYTE* data, DWORD* size) {
+    if (reserved || (data && !size)) return ERROR_INVALID_PARAMETER;
+    Bound at;
+    if (LONG code = bindFor(r, handle, KEY_QUERY_VALUE, at)) return code;
+    auto it = at.key->values.find(RawName{valueName(name)});
+    if (it == at.key->values.end()) {
+        if (!data && size) *size = 0;
+        return ERROR_FILE_NOT_FOUND;
+    }
+    const Value& value = it->second;
+    auto needed = static_cast<DWORD>(value.data.size());
+    if (type) *type = value.type;
+    if (!size) return ERROR_SUCCESS;
+    // A buffer too small is not written at all: only the size it would need is reported.
+    LONG code = (data && *size < needed) ? ERROR_MORE_DATA : ERROR_SUCCESS;
+    if (data && code == ERROR_SUCCESS && needed) std::memcpy(data, value.data.data(), needed);
+    *size = needed;
+    return code;
+}
+
+LONG deleteValue(Registry& r, HKEY handle, const WCHAR* name) {
+    Bound at;
+    if (LONG code = bindFor(r, handle, KEY_SET_VALUE, at)) return code;
+    auto it = at.key->values.find(RawName{valueName(name)});
+    if (it == at.key->values.end()) return ERROR_FILE_NOT_FOUND;
+    at.key->values.erase(it);
+    touch(*at.key);
+    return ERROR_SUCCESS;
+}
+
+// Keys have no class here: a class buffer receives an empty string.
+LONG emptyClass(WCHAR* cls, DWORD* length) {
+    if (!cls) return ERROR_SUCCESS;
+    if (!length) return ERROR_INVALID_PARAMETER;
+    if (*length < 1) return ERROR_MORE_DATA;
+    cls[0] = 0;
+    *length = 0;
+    return ERROR_SUCCESS;
+}
+
+LONG enumKey(Registry& r, HKEY handle, DWORD index, WCHAR* name, DWORD* length, DWORD* reserved,
+             WCHAR* cls, DWORD* classLength, FILETIME* written) {
+    // NULL name or length: Wine crashes, Windows' answer is not recorded; 87 here.
+    if (reserved || !name || !length) return ERROR_INVALID_PARAMETER;
+    Bound at;
+    if (LONG code = bindFor(r, handle, KEY_ENUMERATE_SUB_KEYS, at)) return code;
+    const Key* child = childAt(*at.key, index);
+    if (!child) return ERROR_NO_MORE_ITEMS;
+    // The name must fit with its terminator; if not, neither buffer nor count is written.
+    if (*length <= child->name.size()) return ERROR_MORE_DATA;
+    if (LONG code = emptyClass(cls, classLength)) return code;
+    std::memcpy(name, child->name.data(), child->name.size() * sizeof(WCHAR));
+    name[child->name.size()] = 0;
+    *length = static_cast<DWORD>(child->name.size());
+    if (written) {
+        written->dwLowDateTime = static_cast<DWORD>(child->lastWrite);
+        written->dwHighDateTime = static_cast<DWORD>(child->lastWrite >> 32);
+    }
+    return ERROR_SUCCESS;
+}
+
+LONG closeKey(Registry& r, HKEY handle) {
+    if (!handle) return ERROR_INVALID_HANDLE;
+    // Windows never closes predefined values, defined or not (0x8000000n); a bogus value is
+    // an invalid handle (Wine answers 0 for those, Windows' answer is not recorded).
+    if (isPredefined(handle)) return ERROR_SUCCESS;
+    bool open = r.handles.erase(reinterpret_cast<uintptr_t>(handle)) != 0;
+    return open ? ERROR_SUCCESS : ERROR_INVALID_HANDLE;
+}
+
+}  // namespace
+
+LSTATUS WINAPI RegOpenKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD ulOptions, REGSAM samDesired,
+                             PHKEY phkResult) {
+    LONG code = serve("RegOpenKeyExW", phkResult, [&](Registry& r) {
+        return openKey(r, hKey, lpSubKey, samDesired, phkResult);
+    });
+    w32::record("RegOpenKeyExW",
+                {w32::arg(hKey), w32::arg(lpSubKey), ulOptions, samDesired, w32::arg(phkResult)},
+                code);
+    return code;
+}
+
+LSTATUS WINAPI RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD Reserved, LPWSTR lpClass,
+                               DWORD dwOptions, REGSAM samDesired,
+                               LPSECURITY_ATTRIBUTES lpSecurityAttributes, PHKEY phkResult,
+                               LPDWORD lpdwDisposition) {
+    LONG code = serve("RegCreateKeyExW", phkResult, [&](Registry& r) {
+        return createKey(r, hKey, lpSubKey, Reserved, samDesired, phkResult, lpdwDisposition);
+    });
+    w32::record("RegCreateKeyExW",
+                {w32::arg(hKey), w32::arg(lpSubKey), Reserved, w32::arg(lpClass), dwOptions,
+                 samDesired, w32::arg(lpSecurityAttributes), w32::arg(phkResult),
+                 w32::arg(lpdwDisposition)},
+                code);
+    return code;
+}
+
+LSTATUS WINAPI RegQueryValueExW(HKEY hKey, LPCWSTR lpValueName, LPDWORD lpReserved,
+                                LPDWORD lpType, LPBYTE lpData, LPDWORD lpcbData) {
+    LONG code = serve("RegQueryValueExW", nullptr, [&](Registry& r) {
+        return queryValue(r, hKey, lpValueName, lpReserved, lpType, lpData, lpcbData);
+    });
+    w32::record("RegQueryValueExW",
+                {w32::arg(hKey), w32::arg(lpValueName), w32::arg(lpReserved), w32::arg(lpType),
+                 w32::arg(lpData), w32::arg(lpcbData)},
+                code);
+    return code;
+}
+
+LSTATUS WINAPI RegSetValueExW(HKEY hKey, LPCWSTR lpValueName, DWORD Reserved, DWORD dwType,
+                              const BYTE* lpData, DWORD cbData) {
+    // Reserved is ignored: Windows stores the value with Reserved 1 too.
+    LONG code = serve("RegSetValueExW", nullptr, [&](Registry& r) {
+        return setValue(r, hKey, lpValueName, dwType, lpData, cbData);
+    });
+    w32::record("RegSetValueExW",
+                {w32::arg(hKey), w32::arg(lpValueName), Reserved, dwType, w32::arg(lpData),
+                 cbData},
+                code);
+    return code;
+}
+
+LSTATUS WINAPI RegDeleteKeyW(HKEY hKey, LPCWSTR lpSubKey) {
+    // No view flag: the process's default view, the 32-bit one.
+    LONG code = serve("RegDeleteKeyW", nullptr,
+                      [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, 0); });
+    w32::record("RegDeleteKeyW", {w32::arg(hKey), w32::arg(lpSubKey)}, code);
+    return code;
+}
+
+LSTATUS WINAPI RegDeleteKeyExW(HKEY hKey, LPCWSTR lpSubKey, REGSAM samDesired, DWORD Reserved) {
+    // Reserved is ignored, as Windows does; only the view bits of samDesired count.
+    LONG code = serve("RegDeleteKeyExW", nullptr,
+                      [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, samDesired); });
+    w32::record("RegDeleteKeyExW", {w32::arg(hKey), w32::arg(lpSubKey), samDesired, Reserved},
+                code);
+    return code;
+}
+
+LSTATUS WINAPI RegDeleteValueW(HKEY hKey, LPCWSTR lpValueName) {
+    LONG code = serve("RegDeleteValueW", nullptr,
+                      [&](Registry& r) { return deleteValue(r, hKey, lpValueName); });
+    w32::record("RegDeleteValueW", {w32::arg(hKey), w32::arg(lpValueName)}, code);
+    return code;
+}
+
+LSTATUS WINAPI RegEnumKeyExW(HKEY hKey, DWORD dwIndex, LPWSTR lpName, LPDWORD lpcchName,
+                             LPDWORD lpReserved, LPWSTR lpClass, LPDWORD lpcchClass,
+                             PFILETIME lpftLastWriteTime) {
+    LONG code = serve("RegEnumKeyExW", nullptr, [&](Registry& r) {
+        return enumKey(r, hKey, dwIndex, lpName, lpcchName, lpReserved, lpClass, lpcchClass,
+                       lpftLastWriteTime);
+    });
+    w32::record("RegEnumKeyExW",
+                {w32::arg(hKey), dwIndex, w32::arg(lpName), w32::arg(lpcchName),
+                 w32::arg(lpReserved), w32::arg(lpClass), w32::arg(lpcchClass),
+                 w32::arg(lpftLastWriteTime)},
+                code);
+    return code;
+}
+
+LSTATUS WINAPI RegCloseKey(HKEY hKey) {
+    LONG code = serve("RegCloseKey", nullptr, [&](Registry& r) { return closeKey(r, hKey); });
+    w32::record("RegCloseKey", {w32::arg(hKey)}, code);
+    return code;
+}
