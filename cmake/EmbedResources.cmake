@@ -7,5 +7,5 @@ math(EXPR size "${hexLength} / 2")
 string(REGEX REPLACE "([0-9a-f][0-9a-f])" "0x\\1," bytes "${hex}")
 string(REGEX REPLACE "((0x..,){16})" "\\1\n" bytes "${bytes}")
 file(WRITE ${OUTPUT} "// Generated from ${INPUT}; do not edit.\n#include <stddef.h>\n"
-  "extern \"C\" __attribute__((visibility(\"default\"))) alignas(4) const unsigned char W32ResourceSection[] = {\n${bytes}};\n"
+  "extern \"C\" __attribute__((visibility(\"default\"), aligned(4))) const unsigned char W32ResourceSection[] = {\n${bytes}};\n"
   "extern \"C\" __attribute__((visibility(\"default\"))) const size_t W32ResourceSectionSize = ${size};\n")

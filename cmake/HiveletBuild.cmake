@@ -10,6 +10,12 @@ if(HV_SANITIZE)
   add_link_options(-fsanitize=address,undefined)
 endif()
 
+if(HV_FUZZ)
+  add_compile_options(-fsanitize=fuzzer-no-link,address,undefined -fno-sanitize-recover=all
+                      -fno-omit-frame-pointer)
+  add_link_options(-fsanitize=address,undefined)
+endif()
+
 if(WIN32)
   add_compile_definitions(UNICODE _UNICODE WIN32_LEAN_AND_MEAN)
   # Windows programs link the runtime statically, so they import only system libraries.
