@@ -1,0 +1,88 @@
+// Byte offsets of the host's structures, as the host lays them out for a module built with
+// pointers of a given size. The 32-bit values are the shipped contract; the 64-bit ones follow
+// from the same rule: pointers and pointer-sized values grow to 8 bytes and align to 8, every
+// other field keeps its size.
+#pragma once
+
+#include <cstddef>
+
+namespace hv {
+
+struct HostLayout {
+    size_t pointerSize;
+
+    // ObjectHeader, the host's part of the instance record.
+    size_t runHeader;
+    size_t headerFlags;
+    size_t headerSize;
+    // The module's fields after the header, and the record size GetRunObjectDataSize reports.
+    size_t rootKeyIndex, currentKey, lastError, use64BitView, recordSize;
+
+    // Run header services.
+    size_t getStringBuffer, getFirstExpressionParameter, getNextExpressionParameter;
+    size_t getNextParameter, runHeaderSize;
+
+    // Editor structure.
+    size_t editorWindow, getHostVersion, insertProperties, editorSize;
+
+    // RunObjectInfos.
+    size_t infoConditions, infoActions, infoExpressions;
+    size_t infoConditionCount, infoActionCount, infoExpressionCount;
+    size_t info20, info0, info100, infoHostByte, info0b, infoIdentifier, info1, infoSize;
+
+    // RootKeyParam: the same on every build.
+    size_t rootParamIndex, rootParamSize;
+};
+
+constexpr size_t alignUp(size_t offset, size_t alignment) {
+    return (offset + alignment - 1) / alignment * alignment;
+}
+
+// The layout for a module whose pointers are `p` bytes (4 or 8).
+constexpr HostLayout layoutFor(size_t p) {
+    HostLayout l{};
+    l.pointerSize = p;
+    l.runHeader = 8;
+    l.headerFlags = 124;
+    l.headerSize = 184;
+    l.rootKeyIndex = l.headerSize;
+    l.currentKey = alignUp(l.rootKeyIndex + 4, p);
+    l.lastError = l.currentKey + p;
+    l.use64BitView = l.lastError + 4;
+    l.recordSize = alignUp(l.use64BitView + 4, p);
+
+    l.getStringBuffer = 872;
+    l.getFirstExpressionParameter = l.getStringBuffer + p;
+    l.getNextExpressionParameter = l.getFirstExpressionParameter + p;
+    l.getNextParameter = 928;
+    l.runHeaderSize = l.getNextParameter + p;
+
+    l.editorWindow = alignUp(20, p);
+    l.getHostVersion = 336;
+    l.insertProperties = l.getHostVersion + p;
+    l.editorSize = l.insertProperties + p;
+
+    l.infoConditions = 0;
+    l.infoActions = p;
+    l.infoExpressions = 2 * p;
+    l.infoConditionCount = 3 * p;
+    l.infoActionCount = l.infoConditionCount + 2;
+    l.infoExpressionCount = l.infoConditionCount + 4;
+    l.info20 = l.infoConditionCount + 6;
+    l.info0 = l.infoConditionCount + 8;
+    l.info100 = l.info0 + 4;
+    l.infoHostByte = l.info100 + 1;
+    l.info0b = l.info100 + 2;
+    l.infoIdentifier = l.info100 + 4;
+    l.info1 = l.infoIdentifier + 4;
+    l.infoSize = l.info1 + 2;
+
+    l.rootParamIndex = 6;
+    l.rootParamSize = 16;
+    return l;
+}
+
+// The layout of this build.
+constexpr HostLayout hostLayout = layoutFor(sizeof(void*));
+
+}  // namespace hv

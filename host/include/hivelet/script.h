@@ -1,0 +1,78 @@
+// Event scripts: lines that run the module's conditions, actions and expressions on an
+// instance and check what comes back. The language is described in docs/scripts.md.
+#pragma once
+
+#include <hivelet/host.h>
+
+#include <iosfwd>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace hv::script {
+
+// A value written on a script line.
+struct Value {
+    enum class Kind { Null, Text, Integer, Boolean, RootKey, LastResult, Word };
+    Kind kind = Kind::Null;
+    std::u16string text;   // Text
+    int64_t integer = 0;   // Integer as written (within 32 bits); RootKey: the root index
+    bool boolean = false;  // Boolean
+    std::string word;      // Word: a name the command gives a meaning to; RootKey: as written
+};
+
+// One line of a script, parsed.
+struct Step {
+    int line = 0;
+    std::string source;   // the line without its comment, trimmed
+    std::string command;  // the line's first word
+    // Events (cnd, act, exp): the routine and its parameters.
+    EventKind kind = EventKind::Condition;
+    int code = -1;
+    std::string routine;
+    // What a command checks or changes (expect, poke): "result" when an expectation names none.
+    std::string subject;
+    std::vector<Value> values;  // event parameters, or the command's operands
+    std::string text;           // echo
+};
+
+struct Script {
+    std::string file;
+    std::vector<Step> steps;
+};
+
+struct ParseResult {
+    Script script;
+    std::string error;  // "file:line: message" for the first malformed line, or ""
+    bool ok() const { return error.empty(); }
+};
+
+// Parses a whole script; `file` names it in messages.
+ParseResult parse(const std::string& file, const std::string& text);
+
+// A text as a script would write it: quoted, with escapes for quotes, backslashes and controls.
+std::string quote(const std::u16string& text);
+
+// Runs scripts against one loaded module and writes a transcript. Each script gets a fresh
+// instance; a failure stops its script.
+class Runner {
+public:
+    Runner(Module& module, std::ostream& out, std::ostream& err);
+    ~Runner();
+    // Runs a parsed script; true when every line passed.
+    bool run(const Script& script);
+    // Reads, parses and runs a script file; true when every line passed.
+    bool runFile(const std::string& path);
+
+private:
+    Module& module_;
+    std::ostream& out_;
+    std::ostream& err_;
+};
+
+// The hivelet-host command line (without the program name); returns the exit status:
+// 0 when every script passed, 1 when one failed, 2 for a usage error or a module that cannot
+// be loaded.
+int commandLine(const std::vector<std::string>& args, std::ostream& out, std::ostream& err);
+
+}  // namespace hv::script

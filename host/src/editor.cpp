@@ -1,0 +1,55 @@
+// The editor structure handed to the module's edit-time entry points, with its two services.
+#include "internal.h"
+
+namespace hv {
+
+namespace {
+
+// GetHostVersion takes no arguments, so it answers for the editor in use.
+Editor* activeEditor = nullptr;
+
+}  // namespace
+
+struct EditorServices {
+    static DWORD WINAPI getHostVersion() {
+        if (!activeEditor) return 0;
+        ++activeEditor->hostVersionCalls_;
+        return activeEditor->version_;
+    }
+
+    static void WINAPI insertProperties(Slot hostValue, int one, const void* properties, int one2,
+                                        int one3) {
+        if (activeEditor)
+            activeEditor->inserts_.push_back(
+                Editor::Insert{hostValue, one, one2, one3, properties});
+    }
+};
+
+Editor::Editor() : bytes_(alignUp(hostLayout.editorSize, 16) + fill::guardSize, fill::editor) {
+    setHostVersion(version_, true);
+    writeAt(bytes_.data(), hostLayout.insertProperties, &EditorServices::insertProperties);
+    setWindow(nullptr);
+    activeEditor = this;
+}
+
+Editor::~Editor() {
+    if (activeEditor == this) activeEditor = nullptr;
+}
+
+void Editor::setHostVersion(uint32_t version, bool present) {
+    version_ = version;
+    present_ = present;
+    auto service = present ? &EditorServices::getHostVersion : nullptr;
+    writeAt(bytes_.data(), hostLayout.getHostVersion, service);
+}
+
+void* Editor::structure() {
+    activeEditor = this;
+    return bytes_.data();
+}
+
+void Editor::setWindow(HWND window) {
+    writeAt(bytes_.data(), hostLayout.editorWindow, window);
+}
+
+}  // namespace hv

@@ -1,0 +1,81 @@
+// The parts of the script language shared by its parser and its runner: tokens, the state of a
+// running script, and the tables of commands and expectation subjects.
+#pragma once
+
+#include <hivelet/script.h>
+
+#include <optional>
+#include <ostream>
+
+namespace hv::script {
+
+// A token of a line: a quoted text (escapes resolved) or a bare word.
+struct Token {
+    bool quoted = false;
+    std::u16string text;
+    std::string word;
+};
+
+// Splits `line` from `pos` into tokens up to its end or a comment; returns an error or "".
+// `end` receives where the tokens stop (the comment's start or the line's end).
+std::string lex(const std::string& line, size_t pos, std::vector<Token>& tokens, size_t* end);
+
+// Reads a 32-bit integer written in decimal (possibly negative) or 0x hex; returns an error or "".
+std::string parseInteger(const std::string& word, int64_t& value);
+// Reads an event parameter; returns an error or "".
+std::string parseParameter(const Token& token, Value& value);
+// A value as the script writes it.
+std::string describe(const Value& value);
+
+// The state of one running script: its instance and the last event's outcome.
+class Session {
+public:
+    Session(Module& module, const std::string& file, std::ostream& out, std::ostream& err);
+    Instance& instance() { return *instance_; }
+    void freshInstance();
+    // Reports a failure of `step` as "file:line: message"; returns false for the caller to pass on.
+    bool fail(const Step& step, const std::string& message);
+    // Prints a transcript line for `step`.
+    void show(const Step& step, const std::string& detail);
+    void remember(EventKind kind, Outcome outcome);
+    const Outcome* last() const { return last_ ? &*last_ : nullptr; }
+    EventKind lastKind() const { return lastKind_; }
+
+    std::ostream& out;
+    unsigned events = 0;
+    unsigned expectations = 0;
+
+private:
+    Module& module_;
+    std::string file_;
+    std::ostream& err_;
+    std::unique_ptr<Instance> instance_;
+    std::optional<Outcome> last_;
+    EventKind lastKind_ = EventKind::Condition;
+};
+
+using ParseFunction = std::string (*)(const std::vector<Token>& operands, Step& step);
+using RunFunction = bool (*)(Session& session, const Step& step);
+// Checks an expectation; on a mismatch returns false and says why.
+using CheckFunction = bool (*)(Session& session, const Step& step, std::string& why);
+
+struct Command {
+    const char* name;
+    bool rawText;  // the rest of the line is taken as it is, not split into tokens
+    ParseFunction parse;
+    RunFunction run;
+};
+
+struct Subject {
+    const char* name;
+    bool needsEvent;  // checks the last event rather than the instance's state
+    ParseFunction parse;
+    CheckFunction check;
+};
+
+// The command named `name`, or null.
+const Command* findCommand(const std::string& name);
+// The expectation subject named `name`, or null.
+const Subject* findSubject(const std::string& name);
+
+}  // namespace hv::script
