@@ -8,14 +8,12 @@
 #include "host_services.h"
 #include "routines.h"
 
+#define ROOT(name) {TEXT(#name), name, sizeof(#name) - 1}
 const RootKey RootKeyTable[RootKeyCount + 1] = {
-    {TEXT("HKEY_CLASSES_ROOT"), HKEY_CLASSES_ROOT},
-    {TEXT("HKEY_LOCAL_MACHINE"), HKEY_LOCAL_MACHINE},
-    {TEXT("HKEY_CURRENT_USER"), HKEY_CURRENT_USER},
-    {TEXT("HKEY_CURRENT_CONFIG"), HKEY_CURRENT_CONFIG},
-    {TEXT("HKEY_USERS"), HKEY_USERS},
-    {nullptr, nullptr},
+    ROOT(HKEY_CLASSES_ROOT),   ROOT(HKEY_LOCAL_MACHINE), ROOT(HKEY_CURRENT_USER),
+    ROOT(HKEY_CURRENT_CONFIG), ROOT(HKEY_USERS),         {nullptr, nullptr, 0},
 };
+#undef ROOT
 
 DWORD RootIndexOf(const RootKeyParam* param) {
     const BYTE* b = param->rootIndex;
@@ -23,10 +21,18 @@ DWORD RootIndexOf(const RootKeyParam* param) {
            static_cast<DWORD>(b[2]) << 16 | static_cast<DWORD>(b[3]) << 24;
 }
 
+// Case folding maps each character to one character, so only a name of the same length can be
+// equal: the length test spares the comparison for the other entries, and a long text is never
+// read past the longest name.
 DWORD RootKeyByName(const WCHAR* name) {
+    const size_t longest = sizeof("HKEY_CURRENT_CONFIG") - 1;
+    size_t length = 0;
+    while (length <= longest && name[length]) ++length;
     DWORD index = 0;
-    for (; RootKeyTable[index].name; ++index)
-        if (_wcsicmp(name, RootKeyTable[index].name) == 0) break;
+    for (; RootKeyTable[index].name; ++index) {
+        if (RootKeyTable[index].length == length && _wcsicmp(name, RootKeyTable[index].name) == 0)
+            break;
+    }
     return index;
 }
 

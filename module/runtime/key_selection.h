@@ -8,6 +8,7 @@ const DWORD RootKeyCount = 5;
 struct RootKey {
     const WCHAR* name;
     HKEY handle;
+    size_t length;  // characters of the name
 };
 
 // The five predefined roots, in index order; the names end with a null entry.

@@ -1,6 +1,7 @@
 // Journal and fault injection of the portable Win32 layer.
 #include "internal.h"
 
+#include <atomic>
 #include <map>
 #include <mutex>
 
@@ -23,11 +24,15 @@ State& state() {
     return *s;
 }
 
+// Read on every served call, so it is kept apart from the journal's lock.
+std::atomic<bool> journalOn{true};
+
 }  // namespace
 
 namespace w32 {
 
 void record(std::string_view function, std::initializer_list<uint64_t> args, int64_t result) {
+    if (!journalOn.load(std::memory_order_relaxed)) return;
     State& s = state();
     std::lock_guard<std::mutex> guard(s.lock);
     s.journal.push_back(w32test::Call{std::string(function), std::vector<uint64_t>(args), result});
@@ -57,6 +62,7 @@ void resetAllocations();
 void resetRegistry() __attribute__((weak));
 
 void reset() {
+    setJournal(true);
     clearJournal();
     clearFaults();
     SetLastError(0);
@@ -64,6 +70,8 @@ void reset() {
 }
 
 const std::vector<Call>& journal() { return state().journal; }
+
+void setJournal(bool on) { journalOn.store(on, std::memory_order_relaxed); }
 
 void clearJournal() {
     State& s = state();

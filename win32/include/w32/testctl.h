@@ -21,11 +21,15 @@ struct Call {
     int64_t result = 0;
 };
 
-// Forgets the journal and every armed fault, and returns the layer to its initial state.
+// Forgets the journal and every armed fault, and returns the layer to its initial state
+// (journal on).
 W32_TEST_API void reset();
 
 W32_TEST_API const std::vector<Call>& journal();
 W32_TEST_API void clearJournal();
+// Whether served calls are journaled: on at start and after reset(). Benchmarks switch it off,
+// since the journal's own cost would hide what they measure.
+W32_TEST_API void setJournal(bool on);
 // Number of journal entries for one function.
 W32_TEST_API size_t count(std::string_view function);
 // The journal entries for one function, in call order.
