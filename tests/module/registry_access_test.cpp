@@ -1,0 +1,121 @@
+// The masks, roots and view of the routines proven by their effect: keys that refuse one right,
+// the two copies of HKLM\SOFTWARE, and each root by index and by name.
+#include "registry_fixture.h"
+
+namespace hvreg {
+namespace {
+
+struct Denial {
+    DWORD rights;
+    int seen;  // "Key exists", "Value exists", "Current key exists"
+    DWORD read, write, deleteValue, deleteKey;
+};
+void PrintTo(const Denial& d, std::ostream* os) { *os << "denied " << std::hex << d.rights; }
+
+class RegistryDenials : public RegistryFixture, public ::testing::WithParamInterface<Denial> {};
+
+// Reads ask exactly KEY_READ, writes and value deletions full access, the tree walk only
+// DELETE and enumeration.
+TEST_P(RegistryDenials, EachRoutineNeedsExactlyItsRights) {
+    HV_NEEDS_TEST_CONTROL();
+    const Denial& d = GetParam();
+    standardScene();
+    const std::string scene = sceneState();
+    w32test::denyAccess(CurrentUser, at(u"K"), d.rights);
+    const Param root = Param::rootKey(User), key = Param::str(at(u"K")), d7 = Param::str(u"d");
+    EXPECT_EQ(cond(KeyExists, {root, key}).asCondition(), d.seen);
+    EXPECT_EQ(cond(ValueExists, {root, key, d7}).asCondition(), d.seen);
+    EXPECT_EQ(cond(CurrentKeyExists).asCondition(), d.seen);
+    EXPECT_EQ(expr(GetDword, {Param::str(RootNames[User]), key, d7}).asInteger(), d.read ? 0 : 7);
+    EXPECT_EQ(instance.lastError(), d.read);
+    act(SetDword, {root, key, d7, Param::integerValue(9)});
+    EXPECT_EQ(instance.lastError(), d.write);
+    act(DeleteValue, {root, key, Param::str(u"s")});
+    EXPECT_EQ(instance.lastError(), d.deleteValue);
+    w32test::denyAccess(CurrentUser, at(u"K"), 0);
+    EXPECT_EQ(sceneState(), scene) << "refused writes change nothing";
+    w32test::denyAccess(CurrentUser, at(u"K"), d.rights);
+    act(DeleteKey, {root, key});
+    EXPECT_EQ(instance.lastError(), d.deleteKey);
+    w32test::denyAccess(CurrentUser, at(u"K"), 0);  // recreates K if it went
+    EXPECT_EQ(exists(CurrentUser, at(u"K\\C")), d.deleteKey != 0);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Rights, RegistryDenials,
+    ::testing::Values(Denial{KEY_QUERY_VALUE, 0, 5, 5, 5, 0}, Denial{KEY_SET_VALUE, 1, 0, 5, 5, 0},
+                      Denial{KEY_CREATE_SUB_KEY, 1, 0, 5, 5, 0},
+                      Denial{KEY_ENUMERATE_SUB_KEYS, 0, 5, 5, 5, 5},
+                      Denial{KEY_NOTIFY, 0, 5, 5, 5, 0}, Denial{KEY_CREATE_LINK, 1, 0, 5, 5, 0},
+                      Denial{READ_CONTROL, 0, 5, 5, 5, 0}, Denial{DELETE, 1, 0, 5, 5, 5}));
+
+using RegistryViewFlag = RegistryFixture;
+
+// The 32-bit process's default view of HKLM\SOFTWARE is its own copy; the flag reaches the
+// 64-bit one (Wine runs the tests as a 64-bit process, whose default is the 64-bit view).
+TEST_F(RegistryViewFlag, EachRoutineReachesOnlyTheCopyOfItsView) {
+    HV_NEEDS_TEST_CONTROL();
+    const HKEY machine = HKEY_LOCAL_MACHINE;
+    const std::u16string path = u"SOFTWARE\\HiveletView";
+    const Param root = Param::rootKey(1), key = Param::str(path), v = Param::str(u"v");
+    view64(true);
+    act(SetDword, {root, key, v, Param::integerValue(64)});
+    EXPECT_EQ(stored(machine, path, u"v", KEY_WOW64_64KEY), "4: 40 00 00 00");
+    EXPECT_FALSE(exists(machine, path));
+    for (bool on : {true, false}) {
+        SCOPED_TRACE(on);
+        view64(on);
+        EXPECT_EQ(cond(KeyExists, {root, key}).asCondition(), on);
+        EXPECT_EQ(cond(ValueExists, {root, key, v}).asCondition(), on);
+        EXPECT_EQ(expr(GetDword, {Param::str(RootNames[1]), key, v}).asInteger(), on ? 64 : 0);
+        EXPECT_EQ(instance.lastError(), on ? 0u : 2u);
+    }
+    act(SetString, {root, key, v, Param::str(u"32")});
+    view64(true);
+    act(DeleteValue, {root, key, v});
+    EXPECT_EQ(stored(machine, path, u"v", KEY_WOW64_64KEY), "error 2");
+    EXPECT_EQ(stored(machine, path, u"v"), shown(REG_SZ, u"32"));
+    act(CreateKey, {root, Param::str(path + u"\\Sub")});
+    EXPECT_TRUE(exists(machine, path + u"\\Sub", KEY_WOW64_64KEY));
+    EXPECT_FALSE(exists(machine, path + u"\\Sub"));
+    act(DeleteKey, {root, key});
+    EXPECT_FALSE(exists(machine, path, KEY_WOW64_64KEY));
+    EXPECT_TRUE(exists(machine, path));
+    view64(false);
+    act(DeleteKey, {root, key});
+    EXPECT_FALSE(exists(machine, path));
+}
+
+using RegistryRootTable = RegistryFixture;
+const HKEY RootHandles[5] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,
+                             HKEY_CURRENT_CONFIG, HKEY_USERS};
+
+TEST_F(RegistryRootTable, EachIndexAndEachNameInAnyCaseReachesItsOwnRoot) {
+    put(CurrentUser, at(u"P"), u"v", REG_DWORD, {77, 0, 0, 0});
+    instance.setLastError(Untouched);
+    for (uint32_t i = 0; i < 5; ++i) {
+        SCOPED_TRACE(i);
+        w32test::clearJournal();
+        // An empty path opens the root itself.
+        EXPECT_EQ(cond(KeyExists, {Param::rootKey(i), Param::str(u"")}).asCondition(), 1);
+        if (Layer) {
+            EXPECT_EQ(callsOf(w32test::journal(), "RegOpenKeyExW").at(0).args[0],
+                      handleValue(RootHandles[i]));
+        }
+        EXPECT_EQ(cond(KeyExists, {Param::rootKey(i), Param::str(at(u"P"))}).asCondition(),
+                  i == User);
+    }
+    EXPECT_EQ(instance.lastError(), Untouched) << "conditions leave the error alone";
+    act(CreateKey, {Param::rootKey(User), Param::str(u"")});  // the root itself
+    EXPECT_EQ(instance.lastError(), 0u);
+    for (uint32_t i = 0; i < 5; ++i) {
+        std::u16string lower = RootNames[i];
+        for (char16_t& c : lower) c = c >= u'A' && c <= u'Z' ? char16_t(c + 32) : c;
+        auto o = expr(GetDword, {Param::str(lower), Param::str(at(u"P")), Param::str(u"v")});
+        EXPECT_EQ(o.asInteger(), i == User ? 77 : 0) << i;
+        EXPECT_EQ(instance.lastError(), i == User ? 0u : 2u) << i;  // not 40: the name matched
+    }
+}
+
+}  // namespace
+}  // namespace hvreg
