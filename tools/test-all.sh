@@ -1,17 +1,34 @@
 #!/bin/sh
 # Sets up, builds and tests every build: linux (ASan+UBSan), linux-i386 (under qemu-i386),
-# windows-i686 (the shipped DLL, static checks) and windows-x64 (under Wine).
+# windows-i686 (the shipped DLL, static checks), windows-x64 (under Wine) and fuzz (a short run
+# of every fuzz target). Ends with the totals over all builds.
 set -eu
 cd "$(dirname "$0")/.."
 tools/setup.sh
-presets=${HV_PRESETS:-"linux linux-i386 windows-i686 windows-x64"}
-cleanup() { PATH=/usr/lib/wine:$PATH WINEPREFIX="$PWD/build/windows-x64/wine-prefix" wineserver -k 2>/dev/null || true; }
-trap cleanup EXIT
+presets=${HV_PRESETS:-"linux linux-i386 windows-i686 windows-x64 fuzz"}
+stopWine() {
+  PATH=/usr/lib/wine:$PATH WINEPREFIX="$PWD/build/windows-x64/wine-prefix" wineserver -k 2>/dev/null || true
+}
+trap stopWine EXIT
+mkdir -p build
+summary=build/test-summary.txt
+: >"$summary"
 status=0
 for p in $presets; do
   echo "=== $p"
   cmake --preset "$p" >/dev/null
   cmake --build --preset "$p"
-  ctest --preset "$p" -j2 || status=1
+  log="build/ctest-$p.log"
+  if ctest --preset "$p" -j2 >"$log" 2>&1; then
+    grep -E 'tests passed' "$log" || true
+  else
+    status=1
+    grep -B2 -A30 -E 'Failure|\*\*\*Failed|\*\*\*Timeout|Errors while' "$log" | tail -150 || true
+  fi
+  sed -n 's/.*tests passed, \([0-9]*\) tests\{0,1\} failed out of \([0-9]*\).*/\1 \2/p' "$log" |
+    sed "s/^/$p /" >>"$summary"
 done
+[ "$status" -eq 0 ] || { echo "Some tests failed; the logs are build/ctest-<preset>.log"; }
+awk '{ failed += $2; total += $3; printf "%-14s %5d tests, %d failed\n", $1, $3, $2 }
+     END { printf "ctest: %d passed, %d failed\n", total - failed, failed }' "$summary"
 exit $status
