@@ -91,7 +91,9 @@ bool runEvent(Session& session, const Step& step) {
     std::vector<Param> params(step.values.size());
     for (size_t i = 0; i < params.size(); ++i)
         if (!toParam(session, step, step.values[i], params[i])) return false;
+    size_t mark = session.layer ? journalMark() : 0;
     Outcome outcome = session.instance().run(step.kind, step.code, params);
+    if (session.layer) session.eventCalls = journalSince(mark);
     ++session.events;
     session.show(step, "=> " + resultText(step.kind, outcome) + "   (lastError " +
                            std::to_string(session.instance().lastError()) + ")");
@@ -203,6 +205,7 @@ const Command Commands[] = {
     {"exp", false, parseExpression, runEvent},    {"expect", false, parseExpect, runExpect},
     {"echo", true, parseEcho, runEcho},           {"new", false, parseNothing, runNew},
     {"buffers", false, parseBuffers, runBuffers}, {"poke", false, parsePoke, runPoke},
+    {"reg", false, parseRegistry, runRegistry},   {"layer", false, parseLayer, runLayer},
 };
 
 }  // namespace

@@ -26,17 +26,38 @@ std::string parseInteger(const std::string& word, int64_t& value);
 std::string parseParameter(const Token& token, Value& value);
 // A value as the script writes it.
 std::string describe(const Value& value);
+// The name of a predefined root by its index (HKEY_CLASSES_ROOT ...), or "" past the fifth.
+const char* rootKeyName(uint32_t index);
+// The predefined handle of a root by its index, below 5.
+HKEY rootKeyHandle(uint32_t index);
+
+// A call the portable layer served during an event, from its journal.
+struct LayerCall {
+    std::string function;
+    std::vector<uint64_t> args;
+};
+
+// What a script's layer lines changed, so that it can be undone when the script ends.
+struct LayerChanges {
+    bool faults = false;
+    bool version = false;
+    std::vector<std::string> hidden;
+    std::vector<RegistryLine> denials;
+};
 
 // The state of one running script: its instance and the last event's outcome.
 class Session {
 public:
-    Session(Module& module, const std::string& file, std::ostream& out, std::ostream& err);
+    Session(Module& module, const std::string& file, std::ostream& out, std::ostream& err,
+            bool layer);
     Instance& instance() { return *instance_; }
     void freshInstance();
     // Reports a failure of `step` as "file:line: message"; returns false for the caller to pass on.
     bool fail(const Step& step, const std::string& message);
     // Prints a transcript line for `step`.
     void show(const Step& step, const std::string& detail);
+    // Shows a layer line that this build cannot run, with the reason.
+    void skip(const Step& step);
     void remember(EventKind kind, Outcome outcome);
     const Outcome* last() const { return last_ ? &*last_ : nullptr; }
     EventKind lastKind() const { return lastKind_; }
@@ -44,6 +65,10 @@ public:
     std::ostream& out;
     unsigned events = 0;
     unsigned expectations = 0;
+    unsigned skipped = 0;
+    const bool layer;                   // the portable layer's test control is there
+    std::vector<LayerCall> eventCalls;  // what the layer served during the last event
+    LayerChanges layerChanges;
 
 private:
     Module& module_;
@@ -72,6 +97,22 @@ struct Subject {
     ParseFunction parse;
     CheckFunction check;
 };
+
+// The registry lines (script_registry.cpp) and the layer lines (script_layer.cpp).
+std::string parseRegistry(const std::vector<Token>& operands, Step& step);
+bool runRegistry(Session& session, const Step& step);
+std::string parseLayer(const std::vector<Token>& operands, Step& step);
+bool runLayer(Session& session, const Step& step);
+// Whether `word`, after `layer`, starts a line of the layer's own (deny, fail ...); `next` is
+// the word after it.
+bool isLayerVerb(const std::string& word, const std::string& next);
+// Why a Windows build skips a layer line.
+std::string layerSkipNote(const Step& step);
+// Marks where the layer's journal stands, and reads what it served since the mark.
+size_t journalMark();
+std::vector<LayerCall> journalSince(size_t mark);
+// Undoes what the script's layer lines armed: faults, version settings, hidden exports, denials.
+void undoLayer(Session& session);
 
 // The command named `name`, or null.
 const Command* findCommand(const std::string& name);

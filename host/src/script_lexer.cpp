@@ -155,6 +155,10 @@ std::string parseParameter(const Token& token, Value& value) {
     return std::string();
 }
 
+const char* rootKeyName(uint32_t index) {
+    return index < 5 ? RootNames[index] : "";
+}
+
 std::string describe(const Value& value) {
     switch (value.kind) {
         case Value::Kind::Null: return "null";

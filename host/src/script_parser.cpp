@@ -15,14 +15,41 @@ std::string trimmed(const std::string& text) {
     return text.substr(first, last - first + 1);
 }
 
-// Parses one line into `step`; returns an error, or "" (with an empty command for a line
-// that holds nothing to do).
-std::string parseLine(const std::string& line, Step& step) {
-    size_t start = line.find_first_not_of(" \t");
+// The bare word that starts at or after `pos`, and where it ends.
+std::string wordAt(const std::string& line, size_t pos, size_t* stop) {
+    size_t start = line.find_first_not_of(" \t", pos);
+    if (start == std::string::npos) start = line.size();
+    *stop = line.find_first_of(" \t#\"", start);
+    if (*stop == std::string::npos) *stop = line.size();
+    return line.substr(start, *stop - start);
+}
+
+// Parses the line from `pos` into `step`; returns an error, or "" (with an empty command for a
+// line that holds nothing to do). A `layer` before an ordinary command marks that line as one
+// for the portable layer only.
+std::string parseLine(const std::string& line, size_t pos, Step& step) {
+    size_t start = line.find_first_not_of(" \t", pos);
     if (start == std::string::npos || line[start] == '#') return std::string();
-    size_t stop = line.find_first_of(" \t#\"", start);
-    if (stop == std::string::npos) stop = line.size();
-    step.command = line.substr(start, stop - start);
+    size_t stop = 0;
+    step.command = wordAt(line, start, &stop);
+    if (step.command == "layer") {
+        size_t afterVerb = 0, unused = 0;
+        std::string verb = wordAt(line, stop, &afterVerb);
+        if (verb == "layer") return "layer is written once";
+        if (verb == "}") return "} stands alone on its line";
+        if (!verb.empty() && !isLayerVerb(verb, wordAt(line, afterVerb, &unused))) {
+            step.layerOnly = true;
+            return parseLine(line, stop, step);
+        }
+    }
+    if (step.command == "}") {
+        std::vector<Token> rest;
+        size_t end = 0;
+        std::string error = lex(line, stop, rest, &end);
+        step.source = "}";
+        if (error.empty() && !rest.empty()) error = "stray text after }";
+        return error;
+    }
     const Command* command = findCommand(step.command);
     if (!command) {
         std::string word = step.command.empty() ? line.substr(start, 1) : step.command;
@@ -42,6 +69,21 @@ std::string parseLine(const std::string& line, Step& step) {
     return command->parse(tokens, step);
 }
 
+// Keeps track of `layer {` ... `}`: the lines between them run only with the portable layer.
+// Returns an error, or "" with `keep` false for the block's own lines.
+std::string trackBlock(Step& step, int& blockLine, bool& keep) {
+    bool opens = step.command == "layer" && step.subject == "{";
+    keep = !opens && step.command != "}";
+    if (opens && blockLine)
+        return "layer blocks do not nest (one is open since line " + std::to_string(blockLine) +
+               ")";
+    if (opens) blockLine = step.line;
+    if (step.command == "}" && !blockLine) return "} without layer {";
+    if (step.command == "}") blockLine = 0;
+    if (keep && blockLine) step.layerOnly = true;
+    return std::string();
+}
+
 }  // namespace
 
 ParseResult parse(const std::string& file, const std::string& text) {
@@ -49,18 +91,23 @@ ParseResult parse(const std::string& file, const std::string& text) {
     result.script.file = file;
     std::istringstream lines(text);
     std::string line;
+    int blockLine = 0;  // where the open layer block began
     for (int number = 1; std::getline(lines, line); ++number) {
         if (number == 1 && line.compare(0, 3, "\xEF\xBB\xBF") == 0) line.erase(0, 3);
         if (!line.empty() && line.back() == '\r') line.pop_back();
         Step step;
         step.line = number;
-        std::string error = parseLine(line, step);
+        std::string error = parseLine(line, 0, step);
+        bool keep = false;
+        if (error.empty() && !step.command.empty()) error = trackBlock(step, blockLine, keep);
         if (!error.empty()) {
             result.error = file + ":" + std::to_string(number) + ": " + error;
             return result;
         }
-        if (!step.command.empty()) result.script.steps.push_back(std::move(step));
+        if (keep) result.script.steps.push_back(std::move(step));
     }
+    if (blockLine)
+        result.error = file + ":" + std::to_string(blockLine) + ": layer { is not closed";
     return result;
 }
 

@@ -9,14 +9,16 @@
 
 namespace hv::script {
 
-Session::Session(Module& module, const std::string& file, std::ostream& output, std::ostream& err)
-    : out(output), module_(module), file_(file), err_(err) {
+Session::Session(Module& module, const std::string& file, std::ostream& output, std::ostream& err,
+                 bool withLayer)
+    : out(output), layer(withLayer), module_(module), file_(file), err_(err) {
     freshInstance();
 }
 
 void Session::freshInstance() {
     instance_.reset();
     last_.reset();
+    eventCalls.clear();
     instance_ = std::make_unique<Instance>(module_);
 }
 
@@ -32,27 +34,46 @@ void Session::show(const Step& step, const std::string& detail) {
     out << "   " << detail << '\n';
 }
 
+void Session::skip(const Step& step) {
+    ++skipped;
+    show(step, "skipped under Windows: " + layerSkipNote(step));
+}
+
 void Session::remember(EventKind kind, Outcome outcome) {
     lastKind_ = kind;
     last_ = std::move(outcome);
 }
 
+#ifdef _WIN32
+const bool LayerBuilt = false;
+#else
+const bool LayerBuilt = true;
+#endif
+
 Runner::Runner(Module& module, std::ostream& out, std::ostream& err)
-    : module_(module), out_(out), err_(err) {}
+    : module_(module), out_(out), err_(err), layer_(LayerBuilt) {}
 
 Runner::~Runner() = default;
+
+void Runner::setLayer(bool present) {
+    layer_ = present && LayerBuilt;
+}
 
 bool Runner::run(const Script& script) {
     out_ << "== " << script.file << '\n';
     std::unique_ptr<Session> session;
     try {
-        session = std::make_unique<Session>(module_, script.file, out_, err_);
+        session = std::make_unique<Session>(module_, script.file, out_, err_, layer_);
     } catch (const std::exception& e) {
         out_.flush();
         err_ << script.file << ": cannot create an instance: " << e.what() << std::endl;
         return false;
     }
     for (const Step& step : script.steps) {
+        if (step.layerOnly && !layer_) {
+            session->skip(step);
+            continue;
+        }
         bool passed = false;
         try {
             passed = findCommand(step.command)->run(*session, step);
@@ -60,12 +81,16 @@ bool Runner::run(const Script& script) {
             passed = session->fail(step, e.what());
         }
         if (!passed) {
+            undoLayer(*session);
             out_ << "== " << script.file << ": FAILED at line " << step.line << "\n\n";
             return false;
         }
     }
+    undoLayer(*session);
     out_ << "== " << script.file << ": passed (" << session->events << " events, "
-         << session->expectations << " expectations)\n\n";
+         << session->expectations << " expectations";
+    if (session->skipped) out_ << ", " << session->skipped << " layer lines skipped";
+    out_ << ")\n\n";
     return true;
 }
 

@@ -33,6 +33,17 @@ Ran run(const std::string& text, hv::Module& module = hivelet()) {
     return {passed, out.str(), err.str()};
 }
 
+// Runs a script as a build without the portable layer does.
+Ran runWithoutLayer(const std::string& text) {
+    hv::script::ParseResult parsed = hv::script::parse("t.hvs", text);
+    EXPECT_TRUE(parsed.ok()) << parsed.error;
+    std::ostringstream out, err;
+    hv::script::Runner runner(hivelet(), out, err);
+    runner.setLayer(false);
+    bool passed = runner.run(parsed.script);
+    return {passed, out.str(), err.str()};
+}
+
 bool contains(const std::string& text, const std::string& part) {
     return text.find(part) != std::string::npos;
 }
@@ -124,6 +135,177 @@ TEST(ScriptRunner, SentinelHitFailsTheScript) {
         run("act ActSetDword null null null null\n", *fake);  // action 4 passes bad constants
     EXPECT_EQ(misuse.err,
               "t.hvs:1: host services misused: GetNextParameter: arguments 0, 0, not -1, 0\n");
+}
+
+// The scratch key of these tests, as scripts write it. Under Wine the registry persists, so
+// every test deletes it at both ends.
+const std::string Scratch = "\"Software\\\\HiveletScenarios\\\\host_tests";
+const std::string CleanUp = "reg key delete HKEY_CURRENT_USER " + Scratch + "\"\n";
+
+// A registry line as a script writes it: HKEY_CURRENT_USER and a path below the scratch key.
+std::string at(const std::string& below) {
+    return "HKEY_CURRENT_USER " + Scratch + below + "\"";
+}
+
+// Set-up and checks go through the registry functions, so they meet what the module wrote.
+TEST(ScriptRunner, RegistryLinesMeetTheModulesWrites) {
+    Ran r = run(CleanUp +
+                "reg value set " + at("") + " \"S\" bytes sz \"41 00 42 00\"\n"
+                "reg expect value " + at("") + " \"S\" bytes sz \"41 00 42 00\"\n"
+                "exp ExpGetString \"HKEY_CURRENT_USER\" " + Scratch + "\" \"S\"\n"
+                "expect \"AB\"\n"
+                "act ActSetDword " + at("\\\\Deep") + " \"D\" -2\n"
+                "reg expect value " + at("\\\\Deep") + " \"D\" bytes dword \"fe ff ff ff\"\n"
+                "reg key create " + at("\\\\Deep") + "\n"
+                "reg value delete " + at("") + " \"S\"\n"
+                "reg expect value " + at("") + " \"S\" missing\n"
+                "reg value delete " + at("") + " \"S\"\n"
+                "reg value delete " + at("\\\\None") + " \"S\"\n" +
+                CleanUp +
+                "reg expect key missing " + at("") + "\n" +
+                CleanUp);
+    EXPECT_TRUE(r.passed) << r.err;
+    EXPECT_TRUE(contains(r.out, "\"S\" bytes sz \"41 00 42 00\"   written: REG_SZ, 4 bytes"))
+        << r.out;
+    EXPECT_TRUE(contains(r.out, "reg key create " + at("\\\\Deep") + "   was there")) << r.out;
+    EXPECT_TRUE(contains(r.out, "reg value delete " + at("") + " \"S\"   deleted")) << r.out;
+    EXPECT_TRUE(contains(r.out, "reg value delete " + at("\\\\None") + " \"S\"   was not there"))
+        << r.out;
+    EXPECT_TRUE(contains(r.out, CleanUp.substr(0, CleanUp.size() - 1) + "   was not there"))
+        << r.out;
+    EXPECT_TRUE(contains(r.out, "passed (2 events, 5 expectations)")) << r.out;
+}
+
+TEST(ScriptRunner, RegistryMismatchesNameBothSides) {
+    std::string key = "HKEY_CURRENT_USER " + Scratch + "\"";
+    const std::pair<std::string, std::string> table[] = {
+        {"reg expect key exists " + at("\\\\None"),
+         "expected the key " + at("\\\\None") + " to exist, it is missing"},
+        {"reg expect key missing " + at(""), "expected the key " + key + " to be missing, it exists"},
+        {"reg expect key missing " + at("") + " view32",
+         "expected the key " + key + " view32 to be missing, it exists"},
+        {"reg expect value " + at("") + " \"D\" sz \"x\"",
+         "expected the value \"D\" of " + key +
+             " to be REG_SZ [78 00 00 00], found REG_DWORD [01 00 00 00]"},
+        {"reg expect value " + at("") + " \"D\" bytes dword \"01 00\"",
+         "expected the value \"D\" of " + key +
+             " to be REG_DWORD [01 00], found REG_DWORD [01 00 00 00]"},
+        {"reg expect value " + at("") + " \"D\" missing",
+         "expected the value \"D\" of " + key + " to be none, found REG_DWORD [01 00 00 00]"},
+        {"reg expect value " + at("") + " \"E\" bytes 12345 \"\"",
+         "expected the value \"E\" of " + key + " to be type 12345 [], found no value"},
+        {"reg expect value " + at("\\\\None") + " \"D\" qword 1",
+         "expected the value \"D\" of " + at("\\\\None") +
+             " to be REG_QWORD [01 00 00 00 00 00 00 00], found no key"},
+    };
+    for (const auto& [line, message] : table) {
+        Ran r = run(CleanUp + "reg value set " + at("") + " \"D\" dword 1\n" + line + "\n" +
+                    "echo not reached\n");
+        EXPECT_FALSE(r.passed) << line;
+        EXPECT_EQ(r.err, "t.hvs:3: " + message + "\n") << line;
+        EXPECT_FALSE(contains(r.out, "not reached")) << line;
+    }
+    EXPECT_TRUE(run(CleanUp).passed);
+}
+
+// Without the layer every layer line shows why it was skipped, and nothing of it runs: the
+// wrong expectations in it do not fail the script.
+TEST(ScriptRunner, LayerLinesAreSkippedWithANote) {
+    Ran r = runWithoutLayer(
+        "layer deny HKEY_CURRENT_USER \"Software\" 0x1\n"
+        "layer fail RegOpenKeyExW 1 5\n"
+        "layer hide RegDeleteKeyExW\n"
+        "layer version fail\n"
+        "layer clear\n"
+        "layer expect handles 3\n"
+        "layer expect calls RegOpenKeyExW 9\n"
+        "layer act ActSetRootKey root:9\n"
+        "layer {\n"
+        "  expect error 7\n"
+        "  reg expect key missing HKEY_CURRENT_USER \"Software\"\n"
+        "}\n"
+        "act ActSetRootKey HKEY_USERS\n"
+        "expect error 0\n");
+    EXPECT_TRUE(r.passed) << r.err;
+    const char* const lines[] = {
+        "layer deny HKEY_CURRENT_USER \"Software\" 0x1   skipped under Windows: needs the portable "
+        "layer's access control",
+        "layer fail RegOpenKeyExW 1 5   skipped under Windows: needs the portable layer's fault "
+        "injection",
+        "layer hide RegDeleteKeyExW   skipped under Windows: needs the portable layer's hidden "
+        "exports",
+        "layer version fail   skipped under Windows: needs the portable layer's GetVersionExW "
+        "settings",
+        "layer clear   skipped under Windows: needs the portable layer's fault injection",
+        "layer expect handles 3   skipped under Windows: needs the portable layer's handle count",
+        "layer expect calls RegOpenKeyExW 9   skipped under Windows: needs the portable layer's "
+        "call journal",
+        "   8  layer act ActSetRootKey root:9   skipped under Windows: holds only with the portable "
+        "layer",
+        "  10    expect error 7   skipped under Windows: holds only with the portable layer",
+        "reg expect key missing HKEY_CURRENT_USER \"Software\"   skipped under Windows: holds only "
+        "with the portable layer",
+        "passed (1 events, 1 expectations, 10 layer lines skipped)",
+    };
+    for (const char* line : lines) EXPECT_TRUE(contains(r.out, line)) << line << "\n" << r.out;
+}
+
+// Against the layer: rights denied, calls failed, the journal read; and whatever a script
+// armed is undone when it ends, passed or failed.
+TEST(ScriptRunner, LayerLinesDriveThePortableLayer) {
+#ifdef _WIN32
+    GTEST_SKIP() << "needs the portable layer's test control";
+#endif
+    Ran armed = run(CleanUp +
+                    "reg key create " + at("\\\\Locked") + "\n"
+                    "layer deny " + at("\\\\Locked") + " 0x1\n"
+                    "cnd CndKeyExists " + at("\\\\Locked") + "\n"
+                    "expect false\n"
+                    "layer expect calls RegOpenKeyExW mask 0x20019\n"
+                    "layer expect calls RegCloseKey 0\n"
+                    "layer fail RegOpenKeyExW 1 1021\n"
+                    "exp ExpGetDword \"HKEY_CURRENT_USER\" " + Scratch + "\" \"x\"\n"
+                    "expect error 1021\n"
+                    "layer fail RegQueryValueExW always 5\n"
+                    "layer hide RegDeleteKeyExW\n"
+                    "layer version platform 1\n"
+                    "layer expect handles 0\n"
+                    "layer expect handles 1\n");
+    EXPECT_FALSE(armed.passed);
+    EXPECT_EQ(armed.err, "t.hvs:15: expected 1 registry handles open, got 0\n");
+    Ran undone = run("cnd CndKeyExists " + at("\\\\Locked") + "\n"
+                     "expect true\n"
+                     "exp ExpGetDword \"HKEY_CURRENT_USER\" " + Scratch + "\" \"x\"\n"
+                     "expect error 2\n"
+                     "act ActSet64BitMode 1\n"
+                     "act ActDeleteKey " + at("\\\\Locked") + "\n"
+                     "expect error 0\n"
+                     "layer expect calls RegDeleteKeyExW 1\n" +
+                     CleanUp);
+    EXPECT_TRUE(undone.passed) << undone.err;
+}
+
+TEST(ScriptRunner, LayerMismatchesNameBothSides) {
+#ifdef _WIN32
+    GTEST_SKIP() << "needs the portable layer's test control";
+#endif
+    std::string probe = "cnd CndKeyExists HKEY_CURRENT_USER \"Software\"\n";
+    const std::pair<std::string, std::string> table[] = {
+        {"layer expect calls RegOpenKeyExW 1", "t.hvs:1: expect with no event before it"},
+        {probe + "layer expect calls RegOpenKeyExW 2",
+         "t.hvs:2: expected 2 calls of RegOpenKeyExW in the last event, got 1"},
+        {probe + "layer expect calls RegOpenKeyExW mask 0x20119",
+         "t.hvs:2: expected every RegOpenKeyExW of the last event to ask for 0x20119, call 1 "
+         "asked for 0x20019"},
+        {probe + "layer expect calls RegCreateKeyExW mask 0xF003F",
+         "t.hvs:2: expected calls of RegCreateKeyExW, the last event made none"},
+        {probe + "new\nlayer expect calls RegOpenKeyExW 1", "t.hvs:3: expect with no event before it"},
+    };
+    for (const auto& [script, message] : table) {
+        Ran r = run(script);
+        EXPECT_FALSE(r.passed) << script;
+        EXPECT_EQ(r.err, message + "\n") << script;
+    }
 }
 
 // Writes a script file for the command-line tests.

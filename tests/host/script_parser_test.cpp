@@ -3,6 +3,8 @@
 #include <gtest/gtest.h>
 #include <hivelet/script.h>
 
+#include <cstdint>
+
 namespace {
 
 using hv::script::Step;
@@ -107,6 +109,155 @@ TEST(ScriptParser, LinesCommentsAndEcho) {
     EXPECT_EQ(s[4].values[0].integer, 9);
 }
 
+// The bytes a registry line stores or expects, for comparisons.
+std::vector<uint8_t> bytes(std::initializer_list<int> list) {
+    std::vector<uint8_t> out;
+    for (int b : list) out.push_back(static_cast<uint8_t>(b));
+    return out;
+}
+
+// Each data form gives the type and the exact bytes that go to RegSetValueExW.
+TEST(ScriptParser, RegistryValueData) {
+    struct Row {
+        const char* data;
+        uint32_t type;
+        std::vector<uint8_t> bytes;
+    };
+    const Row table[] = {
+        {"sz \"ab\"", REG_SZ, bytes({'a', 0, 'b', 0, 0, 0})},
+        {"sz \"\"", REG_SZ, bytes({0, 0})},
+        {"sz \"\u20ac\"", REG_SZ, bytes({0xAC, 0x20, 0, 0})},
+        {"expand_sz \"%A%\"", REG_EXPAND_SZ, bytes({'%', 0, 'A', 0, '%', 0, 0, 0})},
+        {"multi_sz \"a\" \"b\"", REG_MULTI_SZ, bytes({'a', 0, 0, 0, 'b', 0, 0, 0, 0, 0})},
+        {"multi_sz", REG_MULTI_SZ, bytes({0, 0})},
+        {"dword -1", REG_DWORD, bytes({0xFF, 0xFF, 0xFF, 0xFF})},
+        {"dword 0x12345678", REG_DWORD, bytes({0x78, 0x56, 0x34, 0x12})},
+        {"qword 5", REG_QWORD, bytes({5, 0, 0, 0, 0, 0, 0, 0})},
+        {"qword -1", REG_QWORD, std::vector<uint8_t>(8, 0xFF)},
+        {"qword 18446744073709551615", REG_QWORD, std::vector<uint8_t>(8, 0xFF)},
+        {"qword -9223372036854775808", REG_QWORD, bytes({0, 0, 0, 0, 0, 0, 0, 0x80})},
+        {"qword 0x0102030405060708", REG_QWORD, bytes({8, 7, 6, 5, 4, 3, 2, 1})},
+        {"binary \"\"", REG_BINARY, {}},
+        {"binary \"01 02ff\"", REG_BINARY, bytes({1, 2, 0xFF})},
+        {"bytes sz \"41 00\"", REG_SZ, bytes({'A', 0})},
+        {"bytes dword \"34 12\"", REG_DWORD, bytes({0x34, 0x12})},
+        {"bytes none \"\"", REG_NONE, {}},
+        {"bytes dword_be \"00\"", REG_DWORD_BIG_ENDIAN, bytes({0})},
+        {"bytes 12345 \"AB\"", 12345, bytes({0xAB})},
+    };
+    for (const Row& row : table) {
+        SCOPED_TRACE(row.data);
+        Step s = only(std::string("reg value set HKEY_USERS \"k\" \"v\" ") + row.data);
+        EXPECT_EQ(s.subject, "value set");
+        EXPECT_TRUE(s.registry.hasData);
+        EXPECT_EQ(s.registry.type, row.type);
+        EXPECT_EQ(s.registry.data, row.bytes);
+        Step e = only(std::string("reg expect value HKEY_USERS \"k\" \"v\" ") + row.data);
+        EXPECT_EQ(e.registry.data, row.bytes);
+    }
+}
+
+TEST(ScriptParser, RegistryLinePlacesAndViews) {
+    std::vector<Step> s = steps(
+        "reg key create HKEY_CURRENT_USER \"Software\\\\A\"\n"
+        "reg key delete HKEY_LOCAL_MACHINE \"SOFTWARE\\\\A\" view64  # both copies\n"
+        "reg value delete HKEY_CLASSES_ROOT \"\" \"\" view32\n"
+        "reg expect key exists HKEY_CURRENT_CONFIG \"x\"\n"
+        "reg expect key missing HKEY_USERS \"x\" view64\n"
+        "reg expect value HKEY_CURRENT_USER \"k\" \"v\" missing\n"
+        "reg expect value HKEY_CURRENT_USER \"k\" \"v\" dword 1 view32\n");
+    ASSERT_EQ(s.size(), 7u);
+    const char* const subjects[] = {"key create",   "key delete",   "value delete", "expect key",
+                                    "expect key",   "expect value", "expect value"};
+    for (size_t i = 0; i < s.size(); ++i) {
+        EXPECT_EQ(s[i].command, "reg") << "line " << i + 1;
+        EXPECT_EQ(s[i].subject, subjects[i]) << "line " << i + 1;
+        EXPECT_FALSE(s[i].layerOnly) << "line " << i + 1;
+    }
+    EXPECT_EQ(s[0].registry.root, 2u);
+    EXPECT_EQ(s[0].registry.path, u"Software\\A");
+    EXPECT_EQ(s[0].registry.view, 0u);
+    EXPECT_EQ(s[1].registry.root, 1u);
+    EXPECT_EQ(s[1].registry.view, static_cast<uint32_t>(KEY_WOW64_64KEY));
+    EXPECT_EQ(s[1].source, "reg key delete HKEY_LOCAL_MACHINE \"SOFTWARE\\\\A\" view64");
+    EXPECT_EQ(s[2].registry.root, 0u);
+    EXPECT_EQ(s[2].registry.name, u"");
+    EXPECT_EQ(s[2].registry.view, static_cast<uint32_t>(KEY_WOW64_32KEY));
+    EXPECT_EQ(s[3].registry.root, 3u);
+    EXPECT_TRUE(s[3].registry.exists);
+    EXPECT_FALSE(s[4].registry.exists);
+    EXPECT_FALSE(s[5].registry.exists);
+    EXPECT_FALSE(s[5].registry.hasData);
+    EXPECT_TRUE(s[6].registry.exists);
+    EXPECT_EQ(s[6].registry.view, static_cast<uint32_t>(KEY_WOW64_32KEY));
+}
+
+// `layer` before a command marks that line; `layer {` ... `}` marks every line between; the
+// layer's own lines are marked too. The braces are no steps of their own.
+TEST(ScriptParser, LayerLinesAndBlocks) {
+    std::vector<Step> s = steps(
+        "layer deny HKEY_CURRENT_USER \"k\" 0x10000 view64\n"
+        "layer fail RegOpenKeyExW 2 5\n"
+        "layer fail GetVersionExW always 87\n"
+        "layer hide RegDeleteKeyExW\n"
+        "layer version platform 1\n"
+        "layer expect handles 0\n"
+        "layer expect calls RegCreateKeyExW mask 0xF013F\n"
+        "layer expect calls RegDeleteKeyW 3\n"
+        "layer cnd CndKeyExists HKEY_USERS \"\"\n"
+        "layer expect error 5\n"
+        "layer echo only \"here\" # kept\n"
+        "act ActSet64BitMode 1\n"
+        "layer {   # a block\n"
+        "  reg key create HKEY_USERS \"k\"\n"
+        "  expect true\n"
+        "}\n"
+        "new\n");
+    ASSERT_EQ(s.size(), 15u);
+    for (size_t i = 0; i < s.size(); ++i) {
+        bool marked = i != 11 && i != 14;
+        EXPECT_EQ(s[i].layerOnly, marked) << "step " << i;
+    }
+    EXPECT_EQ(s[0].subject, "deny");
+    EXPECT_EQ(s[0].registry.path, u"k");
+    EXPECT_EQ(s[0].registry.view, static_cast<uint32_t>(KEY_WOW64_64KEY));
+    EXPECT_EQ(s[0].values[0].integer, 0x10000);
+    EXPECT_EQ(s[1].routine, "RegOpenKeyExW");
+    EXPECT_EQ(s[1].values[0].integer, 2);
+    EXPECT_EQ(s[1].values[1].integer, 5);
+    EXPECT_EQ(s[2].values[0].word, "always");
+    EXPECT_EQ(s[3].subject, "hide");
+    EXPECT_EQ(s[4].values[1].integer, 1);
+    EXPECT_EQ(s[5].subject, "expect handles");
+    EXPECT_EQ(s[6].subject, "expect calls");
+    EXPECT_EQ(s[6].values[0].word, "mask");
+    EXPECT_EQ(s[6].values[1].integer, 0xF013F);
+    EXPECT_EQ(s[7].values[0].integer, 3);
+    EXPECT_EQ(s[8].command, "cnd");
+    EXPECT_EQ(s[8].routine, "CndKeyExists");
+    EXPECT_EQ(s[8].source, "layer cnd CndKeyExists HKEY_USERS \"\"");
+    EXPECT_EQ(s[9].command, "expect");
+    EXPECT_EQ(s[9].subject, "error");
+    EXPECT_EQ(s[10].text, "only \"here\" # kept");
+    EXPECT_EQ(s[12].command, "reg");
+    EXPECT_EQ(s[12].line, 14);
+}
+
+// A block left open is reported at its own line; a closing brace needs an open block.
+TEST(ScriptParser, LayerBlockErrors) {
+    const std::pair<const char*, const char*> table[] = {
+        {"act ActSet64BitMode 1\nlayer {\nnew\n", "t.hvs:2: layer { is not closed"},
+        {"layer {\nlayer {\n}\n", "t.hvs:2: layer blocks do not nest (one is open since line 1)"},
+        {"new\n}\n", "t.hvs:2: } without layer {"},
+        {"layer {\n}\n}\n", "t.hvs:3: } without layer {"},
+        {"layer {\n} new\n", "t.hvs:2: stray text after }"},
+    };
+    for (auto [script, message] : table) {
+        hv::script::ParseResult r = hv::script::parse("t.hvs", script);
+        EXPECT_EQ(r.error, message) << script;
+    }
+}
+
 struct Malformed {
     const char* line;
     const char* message;
@@ -150,6 +301,107 @@ const Malformed MalformedLines[] = {
     {"buffers maybe", "buffers takes on or off"},
     {"poke colour 1", "poke takes rootKeyIndex, lastError or use64BitView and an integer"},
     {"poke lastError", "poke lastError needs an integer"},
+    {"reg", "reg takes key, value or expect"},
+    {"reg keys create HKEY_USERS \"k\"", "reg takes key, value or expect"},
+    {"reg key make HKEY_USERS \"k\"", "reg key takes create or delete"},
+    {"reg value create HKEY_USERS \"k\" \"v\"", "reg value takes set or delete"},
+    {"reg expect HKEY_USERS \"k\"", "reg expect takes key or value"},
+    {"reg expect key HKEY_USERS \"k\"", "reg expect key takes exists or missing"},
+    {"reg key create \"HKEY_USERS\" \"k\"",
+     "reg key create needs a root key name (HKEY_CURRENT_USER ...)"},
+    {"reg key create root:2 \"k\"", "reg key create needs a root key name (HKEY_CURRENT_USER ...)"},
+    {"reg key create HKCU \"k\"", "reg key create needs a root key name (HKEY_CURRENT_USER ...)"},
+    {"reg key delete HKEY_NOWHERE \"k\"", "unknown root key name 'HKEY_NOWHERE'"},
+    {"reg key create HKEY_USERS", "reg key create needs a key path in quotes"},
+    {"reg key create HKEY_USERS k", "reg key create needs a key path in quotes"},
+    {"reg key create HKEY_USERS \"k\" \"v\"", "stray text '\"v\"'"},
+    {"reg key create HKEY_USERS \"k\" view16", "stray text 'view16'"},
+    {"reg key create HKEY_USERS \"k\" view64 view32", "stray text 'view64'"},
+    {"reg value delete HKEY_USERS \"k\"", "reg value delete needs a value name in quotes"},
+    {"reg value set HKEY_USERS \"k\" \"v\"",
+     "reg value set needs a value type: sz, expand_sz, multi_sz, dword, qword, binary or bytes"},
+    {"reg value set HKEY_USERS \"k\" \"v\" \"text\"",
+     "reg value set needs a value type: sz, expand_sz, multi_sz, dword, qword, binary or bytes"},
+    {"reg value set HKEY_USERS \"k\" \"v\" string \"t\"",
+     "reg value set needs a value type: sz, expand_sz, multi_sz, dword, qword, binary or bytes, "
+     "not 'string'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" sz", "sz needs one text in quotes"},
+    {"reg value set HKEY_USERS \"k\" \"v\" sz \"a\" \"b\"", "stray text '\"b\"'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" expand_sz x", "expand_sz needs one text in quotes"},
+    {"reg value set HKEY_USERS \"k\" \"v\" multi_sz \"a\" b", "stray text 'b'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" dword", "dword needs an integer"},
+    {"reg value set HKEY_USERS \"k\" \"v\" dword \"1\"", "dword needs an integer"},
+    {"reg value set HKEY_USERS \"k\" \"v\" dword 0x100000000",
+     "integer out of range '0x100000000'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" dword 1 2", "stray text '2'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" qword 18446744073709551616",
+     "integer out of range '18446744073709551616'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" qword -9223372036854775809",
+     "integer out of range '-9223372036854775809'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" qword 0x10000000000000000",
+     "integer out of range '0x10000000000000000'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" qword 1e3", "bad integer '1e3'"},
+    {"reg value set HKEY_USERS \"k\" \"v\" binary", "binary needs hex bytes in quotes"},
+    {"reg value set HKEY_USERS \"k\" \"v\" binary \"0g\"",
+     "bad hex bytes '0g' (pairs of hex digits, blanks only between bytes)"},
+    {"reg value set HKEY_USERS \"k\" \"v\" binary \"012\"",
+     "bad hex bytes '012' (pairs of hex digits, blanks only between bytes)"},
+    {"reg value set HKEY_USERS \"k\" \"v\" binary \"0 1\"",
+     "bad hex bytes '0 1' (pairs of hex digits, blanks only between bytes)"},
+    {"reg value set HKEY_USERS \"k\" \"v\" bytes \"00\"",
+     "bytes needs a value type and hex bytes in quotes"},
+    {"reg value set HKEY_USERS \"k\" \"v\" bytes text \"00\"",
+     "unknown value type 'text' (none, sz, expand_sz, binary, dword, dword_be, link, multi_sz, "
+     "qword or a number)"},
+    {"reg value set HKEY_USERS \"k\" \"v\" bytes sz", "bytes needs hex bytes in quotes"},
+    {"reg expect value HKEY_USERS \"k\" \"v\"",
+     "reg expect value needs missing or a value type: sz, expand_sz, multi_sz, dword, qword, "
+     "binary or bytes"},
+    {"reg expect value HKEY_USERS \"k\" \"v\" missing now", "stray text 'now'"},
+    {"layer", "layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
+              "expect handles, expect calls"},
+    {"layer # nothing", "layer needs a command, {, or one of: deny, fail, hide, unhide, version, "
+                        "clear, expect handles, expect calls"},
+    {"layer layer new", "layer is written once"},
+    {"layer }", "} stands alone on its line"},
+    {"layer frob", "unknown command 'frob'"},
+    {"layer act ActNoSuch", "unknown action 'ActNoSuch'"},
+    {"layer { now", "stray text 'now'"},
+    {"layer deny HKEY_USERS \"k\"",
+     "layer deny takes a root key name, a key path in quotes and the rights"},
+    {"layer deny HKEY_USERS k 1",
+     "layer deny takes a root key name, a key path in quotes and the rights"},
+    {"layer deny root:1 \"k\" 1",
+     "layer deny takes a root key name, a key path in quotes and the rights"},
+    {"layer deny HKEY_USERS \"k\" read", "bad integer 'read'"},
+    {"layer deny HKEY_USERS \"k\" 1 2", "stray text '2'"},
+    {"layer fail RegOpenKeyExW 1",
+     "layer fail takes a function, which call (1 for the next, or always) and the code"},
+    {"layer fail RegOpenKey 1 5", "the layer cannot fail 'RegOpenKey'"},
+    {"layer fail RegOpenKeyExW 0 5", "layer fail counts calls from 1"},
+    {"layer fail RegOpenKeyExW never 5", "bad integer 'never'"},
+    {"layer fail RegOpenKeyExW 1 5 6", "stray text '6'"},
+    {"layer hide", "layer hide takes an export name"},
+    {"layer unhide \"RegDeleteKeyExW\"", "layer unhide takes an export name"},
+    {"layer hide Reg-Delete", "layer hide takes an export name"},
+    {"layer version", "layer version takes fail, normal or platform and a number"},
+    {"layer version platform", "layer version takes fail, normal or platform and a number"},
+    {"layer version fail now", "stray text 'now'"},
+    {"layer clear all", "stray text 'all'"},
+    {"layer expect handles", "layer expect handles needs a count"},
+    {"layer expect handles -1", "layer expect handles needs a count"},
+    {"layer expect calls RegOpenKeyExW",
+     "layer expect calls takes a function and a count, or mask and a mask"},
+    {"layer expect calls RegOpenKeyExW -1",
+     "layer expect calls takes a function and a count, or mask and a mask"},
+    {"layer expect calls RegCloseKey mask 1", "RegCloseKey takes no access mask"},
+    {"layer expect calls RegOpenKeyExW mask", "layer expect calls takes a function and a count, or "
+                                              "mask and a mask"},
+    {"layer expect calls RegOpenKeyExW 1 2", "stray text '2'"},
+    {"layer expect nothing", "expect takes a text, an integer, true, false or one of: error, "
+                               "message, fetches, buffers, address, rootKeyIndex, currentKey, "
+                               "use64BitView; not 'nothing'"},
+    {"}", "} without layer {"},
 };
 
 // Keeps the quotes and backslashes of a row out of the generated test names.

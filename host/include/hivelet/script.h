@@ -21,6 +21,18 @@ struct Value {
     std::string word;      // Word: a name the command gives a meaning to; RootKey: as written
 };
 
+// What a registry line (`reg ...`, `layer deny`) works on: a key, a value and its data.
+struct RegistryLine {
+    uint32_t root = 0;          // predefined root: 0 HKEY_CLASSES_ROOT ... 4 HKEY_USERS
+    std::u16string path;        // key path below the root
+    std::u16string name;        // value name
+    uint32_t view = 0;          // KEY_WOW64_64KEY, KEY_WOW64_32KEY, or 0 for the default view
+    bool exists = true;         // reg expect: the key or value must exist (false: be missing)
+    bool hasData = false;       // reg value set / reg expect value with a type and data
+    uint32_t type = 0;          // REG_SZ, REG_DWORD ...
+    std::vector<uint8_t> data;  // the value's bytes exactly as stored
+};
+
 // One line of a script, parsed.
 struct Step {
     int line = 0;
@@ -34,6 +46,10 @@ struct Step {
     std::string subject;
     std::vector<Value> values;  // event parameters, or the command's operands
     std::string text;           // echo
+    RegistryLine registry;      // reg, and layer deny
+    // Runs only against the portable Win32 layer (a `layer` line, or a line in a layer block);
+    // a Windows build skips it with a note.
+    bool layerOnly = false;
 };
 
 struct Script {
@@ -63,11 +79,15 @@ public:
     bool run(const Script& script);
     // Reads, parses and runs a script file; true when every line passed.
     bool runFile(const std::string& path);
+    // Whether the portable layer's test control is there to run layer lines: on Linux builds
+    // by default. Without it every layer line is skipped with a note, as on Windows builds.
+    void setLayer(bool present);
 
 private:
     Module& module_;
     std::ostream& out_;
     std::ostream& err_;
+    bool layer_;
 };
 
 // The hivelet-host command line (without the program name); returns the exit status:
