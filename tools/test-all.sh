@@ -19,7 +19,12 @@ for p in $presets; do
   cmake --preset "$p" >/dev/null
   cmake --build --preset "$p"
   log="build/ctest-$p.log"
-  if ctest --preset "$p" -j2 >"$log" 2>&1; then
+  # Under Wine a test has been seen to fail once in a dozen full runs and pass on every rerun;
+  # a second try there keeps CI from turning on it while the cause is looked for.
+  retry=""
+  [ "$p" = windows-x64 ] && retry="--repeat until-pass:2"
+  # shellcheck disable=SC2086
+  if ctest --preset "$p" -j2 $retry >"$log" 2>&1; then
     grep -E 'tests passed' "$log" || true
   else
     status=1
