@@ -49,17 +49,6 @@ std::u16string readText(const uint8_t* p, size_t limit, bool* terminated) {
     return text;
 }
 
-// A number in hex, for messages about flags and host values.
-std::string hex(uint64_t value) {
-    static const char digits[] = "0123456789ABCDEF";
-    std::string out;
-    do {
-        out.insert(out.begin(), digits[value & 15]);
-        value >>= 4;
-    } while (value);
-    return "0x" + out;
-}
-
 }  // namespace
 
 // What the host keeps while one event runs, and its lent buffers until the next event ends.

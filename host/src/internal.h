@@ -18,6 +18,9 @@ inline std::u16string fromWide(const WCHAR* text) {
     return std::u16string(reinterpret_cast<const char16_t*>(text));
 }
 
+// A number in hex ("0x1F"), for messages about flags, masks and host values.
+std::string hex(uint64_t value);
+
 // "a condition", "an action", "an expression".
 inline std::string withArticle(EventKind kind) {
     return (kind == EventKind::Condition ? "a " : "an ") + std::string(kindName(kind));

@@ -20,6 +20,14 @@ struct Token {
 // `end` receives where the tokens stop (the comment's start or the line's end).
 std::string lex(const std::string& line, size_t pos, std::vector<Token>& tokens, size_t* end);
 
+// An integer word split into its form and its digits, leading zeros dropped.
+struct IntegerDigits {
+    bool hex = false;
+    bool negative = false;
+    std::string digits;
+};
+// Checks that `word` is decimal (possibly negative) or 0x hex digits; returns an error or "".
+std::string scanInteger(const std::string& word, IntegerDigits& number);
 // Reads a 32-bit integer written in decimal (possibly negative) or 0x hex; returns an error or "".
 std::string parseInteger(const std::string& word, int64_t& value);
 // Reads an event parameter; returns an error or "".

@@ -220,17 +220,6 @@ uint64_t maskOf(const LayerCall& call) {
     return 0;
 }
 
-// Hex for masks in messages.
-std::string hex(uint64_t value) {
-    static const char digits[] = "0123456789ABCDEF";
-    std::string out;
-    do {
-        out.insert(out.begin(), digits[value & 15]);
-        value >>= 4;
-    } while (value);
-    return "0x" + out;
-}
-
 // Counts the calls of the last event, or checks that every one carried the mask.
 bool checkCalls(Session& session, const Step& step, std::string& why) {
     std::vector<const LayerCall*> calls;

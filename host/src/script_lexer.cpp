@@ -106,17 +106,27 @@ std::string lex(const std::string& line, size_t pos, std::vector<Token>& tokens,
     }
 }
 
-std::string parseInteger(const std::string& word, int64_t& value) {
-    bool hex = word.size() > 2 && word[0] == '0' && (word[1] == 'x' || word[1] == 'X');
-    bool negative = !hex && !word.empty() && word[0] == '-';
-    std::string digits = word.substr(hex ? 2 : negative ? 1 : 0);
-    bool ok = !digits.empty();
-    for (char c : digits) {
+std::string scanInteger(const std::string& word, IntegerDigits& number) {
+    number.hex = word.size() > 2 && word[0] == '0' && (word[1] == 'x' || word[1] == 'X');
+    number.negative = !number.hex && !word.empty() && word[0] == '-';
+    number.digits = word.substr(number.hex ? 2 : number.negative ? 1 : 0);
+    bool ok = !number.digits.empty();
+    for (char c : number.digits) {
         auto u = static_cast<unsigned char>(c);
-        ok = ok && (hex ? std::isxdigit(u) : std::isdigit(u));
+        ok = ok && (number.hex ? std::isxdigit(u) : std::isdigit(u));
     }
     if (!ok) return "bad integer '" + word + "'";
+    std::string& digits = number.digits;
     digits.erase(0, std::min(digits.find_first_not_of('0'), digits.size() - 1));
+    return std::string();
+}
+
+std::string parseInteger(const std::string& word, int64_t& value) {
+    IntegerDigits number;
+    std::string error = scanInteger(word, number);
+    if (!error.empty()) return error;
+    const std::string& digits = number.digits;
+    bool hex = number.hex, negative = number.negative;
     if (digits.size() > 10) return "integer out of range '" + word + "'";
     int64_t magnitude = std::stoll(digits, nullptr, hex ? 16 : 10);
     value = negative ? -magnitude : magnitude;

@@ -120,16 +120,11 @@ std::string parseHex(const std::u16string& text, std::vector<uint8_t>& data) {
 // A 64-bit integer: decimal from -9223372036854775808 to 18446744073709551615, or 0x with up
 // to sixteen hex digits.
 std::string parseInteger64(const std::string& word, uint64_t& value) {
-    bool hex = word.size() > 2 && word[0] == '0' && (word[1] == 'x' || word[1] == 'X');
-    bool negative = !hex && !word.empty() && word[0] == '-';
-    std::string digits = word.substr(hex ? 2 : negative ? 1 : 0);
-    bool ok = !digits.empty();
-    for (char c : digits) {
-        auto u = static_cast<unsigned char>(c);
-        ok = ok && (hex ? std::isxdigit(u) : std::isdigit(u));
-    }
-    if (!ok) return "bad integer '" + word + "'";
-    digits.erase(0, std::min(digits.find_first_not_of('0'), digits.size() - 1));
+    IntegerDigits number;
+    std::string error = scanInteger(word, number);
+    if (!error.empty()) return error;
+    const std::string& digits = number.digits;
+    bool hex = number.hex, negative = number.negative;
     bool fits = hex ? digits.size() <= 16
                     : digits.size() < 20 ||
                           (digits.size() == 20 && digits <= "18446744073709551615");

@@ -110,4 +110,15 @@ long firstNotPattern(const uint8_t* data, uint8_t pattern, size_t size) {
     return -1;
 }
 
+// A number in hex, for messages.
+std::string hex(uint64_t value) {
+    static const char digits[] = "0123456789ABCDEF";
+    std::string out;
+    do {
+        out.insert(out.begin(), digits[value & 15]);
+        value >>= 4;
+    } while (value);
+    return "0x" + out;
+}
+
 }  // namespace hv

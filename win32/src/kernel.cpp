@@ -91,14 +91,14 @@ void WINAPI SetLastError(DWORD code) { lastError = code; }
 
 HMODULE WINAPI LoadLibraryW(LPCWSTR fileName) {
     std::string name = w32::toUtf8(fileName);
+    const bool system = isSystemLibrary(name);
     LoadedLibrary* lib = nullptr;
     if (auto code = w32::takeFault("LoadLibraryW")) {
         SetLastError(static_cast<DWORD>(*code));
     } else if (!fileName) {
         SetLastError(ERROR_INVALID_PARAMETER);
-    } else if (void* dl = isSystemLibrary(name) ? layerHandle()
-                                                 : dlopen(name.c_str(), RTLD_NOW | RTLD_LOCAL)) {
-        lib = attach(dl, isSystemLibrary(name));
+    } else if (void* dl = system ? layerHandle() : dlopen(name.c_str(), RTLD_NOW | RTLD_LOCAL)) {
+        lib = attach(dl, system);
     } else {
         SetLastError(ERROR_MOD_NOT_FOUND);
     }
