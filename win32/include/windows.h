@@ -150,6 +150,41 @@ W32_API DWORD WINAPI FormatMessageW(DWORD flags, LPCVOID source, DWORD messageId
 // User: string resources.
 W32_API int WINAPI LoadStringW(HINSTANCE instance, UINT id, LPWSTR buffer, int bufferMax);
 
+// User: menus. Flags of AppendMenuW, GetMenuState and GetMenuStringW.
+#define MF_STRING 0x0000
+#define MF_BYCOMMAND 0x0000
+#define MF_ENABLED 0x0000
+#define MF_UNCHECKED 0x0000
+#define MF_GRAYED 0x0001
+#define MF_DISABLED 0x0002
+#define MF_BITMAP 0x0004
+#define MF_CHECKED 0x0008
+#define MF_POPUP 0x0010
+#define MF_MENUBARBREAK 0x0020
+#define MF_MENUBREAK 0x0040
+#define MF_END 0x0080
+#define MF_HILITE 0x0080
+#define MF_OWNERDRAW 0x0100
+#define MF_BYPOSITION 0x0400
+#define MF_SEPARATOR 0x0800
+#define MF_DEFAULT 0x1000
+#define MF_HELP 0x4000
+#define ERROR_INVALID_MENU_HANDLE 1401L
+#define ERROR_MENU_ITEM_NOT_FOUND 1456L
+
+W32_API HMENU WINAPI LoadMenuW(HINSTANCE instance, LPCWSTR name);
+W32_API HMENU WINAPI CreatePopupMenu(void);
+W32_API HMENU WINAPI CreateMenu(void);
+W32_API BOOL WINAPI DestroyMenu(HMENU menu);
+W32_API BOOL WINAPI IsMenu(HMENU menu);
+W32_API HMENU WINAPI GetSubMenu(HMENU menu, int position);
+W32_API int WINAPI GetMenuItemCount(HMENU menu);
+W32_API UINT WINAPI GetMenuItemID(HMENU menu, int position);
+W32_API int WINAPI GetMenuStringW(HMENU menu, UINT item, LPWSTR buffer, int bufferMax,
+                                  UINT flags);
+W32_API UINT WINAPI GetMenuState(HMENU menu, UINT item, UINT flags);
+W32_API BOOL WINAPI AppendMenuW(HMENU menu, UINT flags, UINT_PTR idNewItem, LPCWSTR text);
+
 // The module's calloc, malloc and free reach the layer through the linker (--wrap), so tests
 // can make allocation fail without the module's sources knowing.
 

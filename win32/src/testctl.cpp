@@ -66,6 +66,7 @@ void reset() {
     clearJournal();
     clearFaults();
     SetLastError(0);
+    resetMenus();
     if (resetRegistry) resetRegistry();
 }
 

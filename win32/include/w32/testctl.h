@@ -45,6 +45,14 @@ W32_TEST_API void clearFaults();
 // Blocks handed out by calloc/malloc through the layer and not yet freed.
 W32_TEST_API size_t liveAllocations();
 
+// Menus alive that no other menu holds: each is a menu bar or popup that someone must still
+// destroy. A menu's popups are destroyed with it and are not listed.
+W32_TEST_API std::vector<HMENU> liveMenus();
+// Every menu object alive, held popups included.
+W32_TEST_API size_t menuObjectCount();
+// Forgets every menu; reset() calls it.
+W32_TEST_API void resetMenus();
+
 }  // namespace w32test
 
 // ---- Registry test control -------------------------------------------------------------

@@ -1,0 +1,170 @@
+// Menus of the portable layer: templates as the resource compiler writes them, item lookups by
+// position and by command through nested popups, texts cut to a capacity, and ownership.
+#include <gtest/gtest.h>
+#include <w32/testctl.h>
+
+#include <string>
+#include <vector>
+
+#include "menus.h"
+
+namespace {
+
+// Builds a standard menu template: a 4-byte header, then items.
+class Template {
+public:
+    Template() { words_ = {0, 0}; }
+    Template& item(WORD flags, WORD id, std::u16string text) {
+        words_.push_back(flags);
+        words_.push_back(id);
+        return textOf(text);
+    }
+    Template& popup(WORD flags, std::u16string text) {
+        words_.push_back(static_cast<WORD>(flags | MF_POPUP));
+        return textOf(text);
+    }
+    std::vector<BYTE> bytes(size_t cut = 0) const {
+        std::vector<BYTE> b;
+        for (WORD w : words_) {
+            b.push_back(static_cast<BYTE>(w));
+            b.push_back(static_cast<BYTE>(w >> 8));
+        }
+        b.resize(b.size() - cut);
+        return b;
+    }
+
+private:
+    Template& textOf(const std::u16string& text) {
+        for (char16_t c : text) words_.push_back(c);
+        words_.push_back(0);
+        return *this;
+    }
+    std::vector<WORD> words_;
+};
+
+std::u16string textOf(HMENU menu, UINT item, UINT flags, int capacity = 64) {
+    std::vector<char16_t> buffer(static_cast<size_t>(capacity) + 4, u'#');
+    GetMenuStringW(menu, item, reinterpret_cast<LPWSTR>(buffer.data()), capacity, flags);
+    return std::u16string(buffer.data());
+}
+
+// One bar with a popup "File" (Open 10, separator, popup "Recent" with "One" 11, "Save" 12 greyed
+// and checked) and a last item "Help" 13.
+HMENU sample() {
+    Template t;
+    t.popup(0, u"File")
+        .item(0, 10, u"Open")
+        .item(0, 0, u"")
+        .popup(0, u"Recent")
+        .item(MF_END, 11, u"One")
+        .item(MF_END | MF_GRAYED | MF_CHECKED, 12, u"Save")
+        .item(MF_END, 13, u"Help");
+    std::vector<BYTE> b = t.bytes();
+    return w32::menuFromTemplate(b.data(), b.size());
+}
+
+class Menus : public ::testing::Test {
+protected:
+    void SetUp() override { w32test::reset(); }
+    void TearDown() override { w32test::reset(); }
+};
+
+TEST_F(Menus, TemplateItemsByPositionAndByCommand) {
+    HMENU bar = sample();
+    ASSERT_NE(bar, nullptr);
+    ASSERT_EQ(GetMenuItemCount(bar), 2);
+    HMENU file = GetSubMenu(bar, 0);
+    ASSERT_NE(file, nullptr);
+    EXPECT_EQ(GetSubMenu(bar, 1), nullptr);
+    EXPECT_EQ(GetMenuItemID(bar, 0), 0xFFFFFFFFu);  // opens a popup
+    EXPECT_EQ(GetMenuItemID(bar, 1), 13u);
+    EXPECT_EQ(GetMenuItemID(bar, 2), 0xFFFFFFFFu);  // no such position
+    ASSERT_EQ(GetMenuItemCount(file), 4);
+    EXPECT_EQ(GetMenuItemID(file, 1), 0u);          // separator
+    EXPECT_EQ(GetMenuState(file, 1, MF_BYPOSITION), UINT{MF_SEPARATOR});
+    EXPECT_EQ(GetMenuState(file, 2, MF_BYPOSITION), (1u << 8) | MF_POPUP);
+    EXPECT_EQ(GetMenuState(file, 3, MF_BYPOSITION), UINT{MF_GRAYED | MF_CHECKED});
+    EXPECT_EQ(GetMenuState(file, 4, MF_BYPOSITION), 0xFFFFFFFFu);
+
+    EXPECT_EQ(textOf(bar, 0, MF_BYPOSITION), u"File");
+    EXPECT_EQ(textOf(file, 2, MF_BYPOSITION), u"Recent");
+    // By command the search goes through every nested popup.
+    EXPECT_EQ(textOf(bar, 11, MF_BYCOMMAND), u"One");
+    EXPECT_EQ(textOf(bar, 12, MF_BYCOMMAND), u"Save");
+    EXPECT_EQ(GetMenuState(bar, 12, MF_BYCOMMAND), UINT{MF_GRAYED | MF_CHECKED});
+    // Not found: 0, the buffer emptied, the reason in the last error.
+    EXPECT_EQ(textOf(bar, 99, MF_BYCOMMAND), u"");
+    EXPECT_EQ(GetLastError(), DWORD{ERROR_MENU_ITEM_NOT_FOUND});
+    EXPECT_TRUE(DestroyMenu(bar));
+}
+
+TEST_F(Menus, TextsAreCutToTheCapacityAndTerminated) {
+    HMENU bar = sample();
+    HMENU file = GetSubMenu(bar, 0);
+    char16_t buffer[8];
+    std::fill(std::begin(buffer), std::end(buffer), u'#');
+    EXPECT_EQ(GetMenuStringW(file, 0, reinterpret_cast<LPWSTR>(buffer), 3, MF_BYPOSITION), 2);
+    EXPECT_EQ(std::u16string(buffer, 4), std::u16string(u"Op\0#", 4));
+    EXPECT_EQ(GetMenuStringW(file, 0, nullptr, 0, MF_BYPOSITION), 4);  // the length alone
+    std::fill(std::begin(buffer), std::end(buffer), u'#');
+    EXPECT_EQ(GetMenuStringW(file, 1, reinterpret_cast<LPWSTR>(buffer), 8, MF_BYPOSITION), 0);
+    EXPECT_EQ(buffer[0], u'\0');  // a separator has no text
+    DestroyMenu(bar);
+}
+
+TEST_F(Menus, MalformedTemplatesGiveNoMenuAndLeaveNothingAlive) {
+    Template good;
+    good.popup(MF_END, u"P").item(MF_END, 1, u"A");
+    std::vector<BYTE> whole = good.bytes();
+    for (size_t cut = 1; cut < whole.size() - 4; ++cut) {
+        std::vector<BYTE> b = good.bytes(cut);
+        EXPECT_EQ(w32::menuFromTemplate(b.data(), b.size()), nullptr) << "cut " << cut;
+    }
+    Template noEnd;
+    noEnd.item(0, 1, u"A");
+    std::vector<BYTE> b = noEnd.bytes();
+    EXPECT_EQ(w32::menuFromTemplate(b.data(), b.size()), nullptr);
+    Template deep;
+    for (unsigned i = 0; i <= w32::menuDepthLimit + 1; ++i) deep.popup(MF_END, u"x");
+    deep.item(MF_END, 1, u"A");
+    b = deep.bytes();
+    EXPECT_EQ(w32::menuFromTemplate(b.data(), b.size()), nullptr);
+    const BYTE extended[] = {1, 0, 4, 0, 0, 0, 0, 0};
+    EXPECT_EQ(w32::menuFromTemplate(extended, sizeof extended), nullptr);
+    EXPECT_EQ(w32test::menuObjectCount(), 0u);
+}
+
+TEST_F(Menus, AppendedPopupsBelongToTheirMenuAndDieWithIt) {
+    HMENU top = CreatePopupMenu();
+    HMENU sub = CreatePopupMenu();
+    EXPECT_EQ(w32test::liveMenus().size(), 2u);
+    ASSERT_TRUE(AppendMenuW(top, MF_POPUP, reinterpret_cast<UINT_PTR>(sub), u"Sub"));
+    ASSERT_TRUE(AppendMenuW(sub, MF_CHECKED, 7, u"Seven"));
+    ASSERT_TRUE(AppendMenuW(top, MF_SEPARATOR, 0, nullptr));
+    EXPECT_EQ(w32test::liveMenus(), std::vector<HMENU>{top});
+    EXPECT_EQ(GetSubMenu(top, 0), sub);
+    EXPECT_EQ(GetMenuItemID(top, 1), 0u);
+    EXPECT_EQ(textOf(top, 7, MF_BYCOMMAND), u"Seven");
+    EXPECT_EQ(GetMenuState(top, 7, MF_BYCOMMAND), UINT{MF_CHECKED});
+    EXPECT_TRUE(DestroyMenu(top));
+    EXPECT_EQ(w32test::menuObjectCount(), 0u);
+    // Stale handles stay invalid.
+    EXPECT_FALSE(IsMenu(sub));
+    EXPECT_FALSE(DestroyMenu(top));
+    EXPECT_EQ(GetLastError(), DWORD{ERROR_INVALID_MENU_HANDLE});
+    EXPECT_EQ(GetMenuItemCount(top), -1);
+    EXPECT_FALSE(AppendMenuW(top, 0, 1, u"x"));
+    EXPECT_FALSE(AppendMenuW(CreatePopupMenu(), MF_POPUP, reinterpret_cast<UINT_PTR>(sub), u"x"));
+}
+
+TEST_F(Menus, InjectedFaults) {
+    w32test::failCall("CreatePopupMenu", 1, 8);
+    EXPECT_EQ(CreatePopupMenu(), nullptr);
+    EXPECT_EQ(GetLastError(), 8u);
+    HMENU menu = CreatePopupMenu();
+    w32test::failCall("AppendMenuW", 1, 8);
+    EXPECT_FALSE(AppendMenuW(menu, 0, 1, u"x"));
+    EXPECT_EQ(GetMenuItemCount(menu), 0);
+}
+
+}  // namespace
