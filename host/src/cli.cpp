@@ -1,4 +1,6 @@
 // The hivelet-host command line.
+#include <hivelet/catalogue.h>
+
 #include <fstream>
 #include <iterator>
 #include <ostream>
@@ -12,6 +14,7 @@ namespace {
 const char Usage[] =
     "usage: hivelet-host run [--module PATH] SCRIPT...\n"
     "       hivelet-host check SCRIPT...\n"
+    "       hivelet-host menus [--module PATH]\n"
     "       hivelet-host --help\n"
     "\n"
     "Plays the authoring host for the Hivelet module: loads it, creates an instance per\n"
@@ -20,6 +23,8 @@ const char Usage[] =
     "\n"
     "  run     run the scripts; the exit status is 0 when all passed, 1 when one failed\n"
     "  check   only parse the scripts and report malformed lines\n"
+    "  menus   print the editor's view of the events: the three menus as trees, each event\n"
+    "          with its code, display text and parameter titles\n"
     "  --module PATH   the module to load; by default $HIVELET_MODULE, or else Hivelet.hzx\n"
     "                  beside this program\n"
     "\n"
@@ -77,6 +82,36 @@ int runCommand(const std::vector<std::string>& args, std::ostream& out, std::ost
     return failed ? 1 : 0;
 }
 
+// `menus`: the editor's view of the module's events.
+int menusCommand(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
+    std::string path;
+    for (size_t i = 1; i < args.size(); ++i) {
+        if (args[i] == "--module" && i + 1 < args.size()) {
+            path = args[++i];
+        } else if (args[i].compare(0, 9, "--module=") == 0) {
+            path = args[i].substr(9);
+        } else {
+            return usageError(err, "menus takes no argument " + args[i]);
+        }
+    }
+    if (path.empty()) path = defaultModulePath();
+    std::string error;
+    std::unique_ptr<Module> module = Module::load(path, &error);
+    if (!module) {
+        err << "hivelet-host: " << error << std::endl;
+        return 2;
+    }
+    Editor editor;
+    Catalogue catalogue(*module, editor);
+    try {
+        printEditorView(catalogue, out);
+    } catch (const std::exception& e) {
+        err << "hivelet-host: " << e.what() << std::endl;
+        return 1;
+    }
+    return 0;
+}
+
 // `check`: parses the scripts without loading a module.
 int checkCommand(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
     if (args.size() < 2) return usageError(err, "check needs at least one script");
@@ -106,6 +141,7 @@ int commandLine(const std::vector<std::string>& args, std::ostream& out, std::os
     }
     if (command == "run") return runCommand(args, out, err);
     if (command == "check") return checkCommand(args, out, err);
+    if (command == "menus") return menusCommand(args, out, err);
     return usageError(err, "unknown command " + command);
 }
 

@@ -1,0 +1,280 @@
+// The editor's side of the event catalogue: menus, entries, texts and filled-in sentences.
+#include <hivelet/catalogue.h>
+#include <hivelet/script.h>
+
+#include <stdexcept>
+
+#include "guarded.h"
+#include "internal.h"
+
+namespace hv {
+
+namespace {
+
+typedef HMENU(WINAPI* MenuFn)(void*, Slot, Slot);
+typedef short(WINAPI* CodeFn)(void*, Slot);
+typedef const int16_t*(WINAPI* InfosFn)(void*, Slot);
+typedef void(WINAPI* StringFn)(void*, Slot, LPWSTR, Slot);
+typedef void(WINAPI* TitleFn)(void*, Slot, Slot, LPWSTR, Slot);
+typedef void(WINAPI* ExpressionTitleFn)(void*, Slot, LPWSTR, Slot);
+typedef void(WINAPI* ParameterStringFn)(void*, Slot, void*, LPWSTR, Slot);
+typedef void(WINAPI* ObjInfosFn)(Slot, Slot, LPWSTR, LPWSTR, LPWSTR, LPWSTR, LPWSTR);
+
+// Export names by kind: condition, action, expression.
+const char* exportName(EventKind kind, const char* condition, const char* action,
+                       const char* expression) {
+    switch (kind) {
+        case EventKind::Condition: return condition;
+        case EventKind::Action: return action;
+        default: return expression;
+    }
+}
+
+// A buffer of `capacity` characters lent to one entry point: it starts empty, and after the
+// call its guards are checked.
+class TextBuffer {
+public:
+    TextBuffer(const char* entryPoint, int capacity)
+        : block_(std::string(entryPoint) + "'s buffer",
+                 2 * static_cast<size_t>(capacity > 0 ? capacity : 0) + 2, 0) {}
+    LPWSTR data() { return reinterpret_cast<LPWSTR>(block_.data()); }
+    // The text up to its terminator (or the capacity, if the module left none).
+    std::u16string text() {
+        std::string damage = block_.damage();
+        if (!damage.empty()) throw std::runtime_error(damage);
+        const char16_t* p = reinterpret_cast<const char16_t*>(block_.data());
+        size_t n = 0;
+        while (n < block_.size() / 2 - 1 && p[n]) ++n;
+        return std::u16string(p, n);
+    }
+
+private:
+    Guarded block_;
+};
+
+void readItems(HMENU menu, std::vector<MenuEntry>& items, int depth) {
+    WCHAR text[256];
+    int count = GetMenuItemCount(menu);
+    for (int position = 0; position < count; ++position) {
+        MenuEntry entry;
+        UINT id = GetMenuItemID(menu, position);
+        HMENU popup = GetSubMenu(menu, position);
+        text[0] = 0;
+        GetMenuStringW(menu, static_cast<UINT>(position), text, 256, MF_BYPOSITION);
+        entry.text = fromWide(text);
+        if (popup) {
+            entry.kind = MenuEntry::Kind::Popup;
+            if (depth < 16) readItems(popup, entry.items, depth + 1);
+        } else if (id == 0) {
+            entry.kind = MenuEntry::Kind::Separator;
+        } else {
+            entry.id = id;
+            entry.state = GetMenuState(menu, static_cast<UINT>(position), MF_BYPOSITION);
+        }
+        items.push_back(std::move(entry));
+    }
+}
+
+}  // namespace
+
+std::vector<MenuEntry> readMenu(HMENU menu) {
+    std::vector<MenuEntry> items;
+    readItems(menu, items, 0);
+    return items;
+}
+
+std::string paramTypeName(int16_t type) {
+    switch (type) {
+        case paramType::rootKey: return "root key";
+        case paramType::text: return "text";
+        case paramType::integer: return "integer";
+        case paramType::expressionText: return "text argument";
+        default: return "type " + std::to_string(type);
+    }
+}
+
+int Catalogue::eventCount(EventKind kind) {
+    switch (kind) {
+        case EventKind::Condition: return 5;
+        case EventKind::Action: return 13;
+        default: return 8;
+    }
+}
+
+HMENU Catalogue::menu(EventKind kind) {
+    auto fn = module_.entry<MenuFn>(
+        exportName(kind, "GetConditionMenu", "GetActionMenu", "GetExpressionMenu"));
+    return fn(editor_.structure(), 0, 0);
+}
+
+std::optional<std::vector<MenuEntry>> Catalogue::menuItems(EventKind kind) {
+    HMENU handle = menu(kind);
+    if (!handle) return std::nullopt;
+    std::vector<MenuEntry> items = readMenu(handle);
+    DestroyMenu(handle);
+    return items;
+}
+
+int Catalogue::codeFromMenu(EventKind kind, uint32_t id) {
+    auto fn = module_.entry<CodeFn>(exportName(kind, "GetConditionCodeFromMenu",
+                                               "GetActionCodeFromMenu",
+                                               "GetExpressionCodeFromMenu"));
+    return fn(editor_.structure(), static_cast<Slot>(id));
+}
+
+const int16_t* Catalogue::infos(EventKind kind, int code) {
+    auto fn = module_.entry<InfosFn>(
+        exportName(kind, "GetConditionInfos", "GetActionInfos", "GetExpressionInfos"));
+    return fn(editor_.structure(), code);
+}
+
+std::optional<EventEntry> Catalogue::entry(EventKind kind, int code) {
+    const int16_t* words = infos(kind, code);
+    if (!words) return std::nullopt;
+    EventEntry e;
+    e.menuId = static_cast<uint16_t>(words[-2]);
+    e.stringId = static_cast<uint16_t>(words[-1]);
+    e.code = words[0];
+    e.flags = words[1];
+    int16_t count = words[2];
+    for (int16_t i = 0; i < count && i < 16; ++i) {
+        e.types.push_back(words[3 + i]);
+        e.titleIds.push_back(words[3 + count + i]);
+    }
+    return e;
+}
+
+std::u16string Catalogue::displayText(EventKind kind, int code, int capacity) {
+    const char* name =
+        exportName(kind, "GetConditionString", "GetActionString", "GetExpressionString");
+    TextBuffer buffer(name, capacity);
+    module_.entry<StringFn>(name)(editor_.structure(), code, buffer.data(), capacity);
+    return buffer.text();
+}
+
+std::u16string Catalogue::title(EventKind kind, int code, int index, int capacity) {
+    if (kind == EventKind::Expression) {
+        TextBuffer buffer("GetExpressionTitle", capacity);
+        if (index != 0) return std::u16string();
+        module_.entry<ExpressionTitleFn>("GetExpressionTitle")(editor_.structure(), code,
+                                                               buffer.data(), capacity);
+        return buffer.text();
+    }
+    const char* name = exportName(kind, "GetConditionTitle", "GetActionTitle", "");
+    TextBuffer buffer(name, capacity);
+    module_.entry<TitleFn>(name)(editor_.structure(), code, index, buffer.data(), capacity);
+    return buffer.text();
+}
+
+std::u16string Catalogue::expressionParam(int code, int index, int capacity) {
+    TextBuffer buffer("GetExpressionParam", capacity);
+    module_.entry<TitleFn>("GetExpressionParam")(editor_.structure(), code, index, buffer.data(),
+                                                 capacity);
+    return buffer.text();
+}
+
+std::u16string Catalogue::parameterText(const Param& param) {
+    switch (param.kind) {
+        case Param::Kind::Text: return fromUtf8(script::quote(param.text));
+        case Param::Kind::Integer: return fromUtf8(std::to_string(param.integer));
+        case Param::Kind::RootKey: {
+            auto fn = reinterpret_cast<ParameterStringFn>(
+                reinterpret_cast<void*>(module_.address("GetParameterString")));
+            std::vector<uint8_t> record = rootKeyRecord(param.rootIndex);
+            TextBuffer buffer("GetParameterString", 64);
+            if (fn) fn(editor_.structure(), 0, record.data(), buffer.data(), 64);
+            return buffer.text();
+        }
+        case Param::Kind::Null: return u"(null)";
+        default: return u"?";
+    }
+}
+
+std::u16string Catalogue::sentence(EventKind kind, int code, const std::vector<Param>& params) {
+    std::u16string format = displayText(kind, code);
+    std::u16string out;
+    if (kind == EventKind::Expression) {
+        out = format;
+        for (size_t i = 0; i < params.size(); ++i)
+            out += (i ? u", " : u"") + parameterText(params[i]);
+        return out + u")";
+    }
+    for (size_t i = 0; i < format.size(); ++i) {
+        char16_t next = i + 1 < format.size() ? format[i + 1] : 0;
+        if (format[i] == u'%' && next >= u'0' && next <= u'3') {
+            size_t index = static_cast<size_t>(next - u'0');
+            out += index < params.size() ? parameterText(params[index]) : u"%" + std::u16string(1, next);
+            ++i;
+        } else if (format[i] == u'%' && next == u'o') {
+            TextBuffer name("GetObjInfos", 255);
+            std::vector<WCHAR> scratch(4 * 1024 + 4);
+            module_.entry<ObjInfosFn>("GetObjInfos")(0, 0, name.data(), scratch.data(),
+                                                     scratch.data() + 1024,
+                                                     scratch.data() + 2048,
+                                                     scratch.data() + 3072);
+            out += name.text();
+            ++i;
+        } else {
+            out += format[i];
+        }
+    }
+    return out;
+}
+
+namespace {
+
+void printItems(Catalogue& catalogue, EventKind kind, const std::vector<MenuEntry>& items,
+                int depth, std::ostream& out) {
+    std::string indent(2 * static_cast<size_t>(depth), ' ');
+    for (const MenuEntry& item : items) {
+        if (item.kind == MenuEntry::Kind::Separator) {
+            out << indent << "----\n";
+            continue;
+        }
+        if (item.kind == MenuEntry::Kind::Popup) {
+            out << indent << toUtf8(item.text) << " >\n";
+            printItems(catalogue, kind, item.items, depth + 1, out);
+            continue;
+        }
+        int code = catalogue.codeFromMenu(kind, item.id);
+        out << indent << toUtf8(item.text) << "  [" << item.id << "]";
+        std::optional<EventEntry> entry =
+            code >= 0 ? catalogue.entry(kind, code) : std::optional<EventEntry>();
+        if (!entry) {
+            out << "  no event (code " << code << ")\n";
+            continue;
+        }
+        const std::vector<std::string>& names = routineNames(kind);
+        out << "  code " << code << ' '
+            << (static_cast<size_t>(code) < names.size() ? names[static_cast<size_t>(code)] : "?")
+            << ", flags " << hex(static_cast<uint16_t>(entry->flags)) << ": \""
+            << toUtf8(catalogue.displayText(kind, code)) << "\"\n";
+        for (size_t i = 0; i < entry->types.size(); ++i) {
+            int index = static_cast<int>(i);
+            std::u16string title = kind == EventKind::Expression
+                                       ? catalogue.expressionParam(code, index)
+                                       : catalogue.title(kind, code, index);
+            out << indent << "    %" << i << " " << paramTypeName(entry->types[i]) << ": \""
+                << toUtf8(title) << "\"\n";
+        }
+    }
+}
+
+}  // namespace
+
+void printEditorView(Catalogue& catalogue, std::ostream& out) {
+    const std::pair<EventKind, const char*> menus[] = {{EventKind::Condition, "Conditions"},
+                                                       {EventKind::Action, "Actions"},
+                                                       {EventKind::Expression, "Expressions"}};
+    for (auto [kind, heading] : menus) {
+        out << heading << '\n';
+        std::optional<std::vector<MenuEntry>> items = catalogue.menuItems(kind);
+        if (!items) {
+            out << "  (the module gave no menu)\n";
+            continue;
+        }
+        printItems(catalogue, kind, *items, 1, out);
+    }
+}
+
+}  // namespace hv
