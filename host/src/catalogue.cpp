@@ -1,6 +1,5 @@
 // The editor's side of the event catalogue: menus, entries, texts and filled-in sentences.
 #include <hivelet/catalogue.h>
-#include <hivelet/script.h>
 
 #include <stdexcept>
 
@@ -175,7 +174,7 @@ std::u16string Catalogue::expressionParam(int code, int index, int capacity) {
 
 std::u16string Catalogue::parameterText(const Param& param) {
     switch (param.kind) {
-        case Param::Kind::Text: return fromUtf8(script::quote(param.text));
+        case Param::Kind::Text: return u"\"" + param.text + u"\"";
         case Param::Kind::Integer: return fromUtf8(std::to_string(param.integer));
         case Param::Kind::RootKey: {
             auto fn = reinterpret_cast<ParameterStringFn>(

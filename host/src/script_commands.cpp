@@ -1,4 +1,6 @@
 // The commands of the script language: how each line is read and what running it does.
+#include <hivelet/catalogue.h>
+
 #include <cstring>
 
 #include "internal.h"
@@ -127,6 +129,34 @@ bool runExpect(Session& session, const Step& step) {
     return true;
 }
 
+// show cnd|act|exp ROUTINE PARAMETERS...: the event as the event sheet shows it.
+std::string parseShow(const std::vector<Token>& operands, Step& step) {
+    const std::pair<const char*, EventKind> kinds[] = {{"cnd", EventKind::Condition},
+                                                       {"act", EventKind::Action},
+                                                       {"exp", EventKind::Expression}};
+    if (!operands.empty() && !operands[0].quoted)
+        for (auto [word, kind] : kinds)
+            if (operands[0].word == word)
+                return parseEvent(std::vector<Token>(operands.begin() + 1, operands.end()), step,
+                                  kind);
+    return "show takes cnd, act or exp, a routine name and its parameters";
+}
+
+bool runShow(Session& session, const Step& step) {
+    std::vector<Param> params(step.values.size());
+    for (size_t i = 0; i < params.size(); ++i)
+        if (!toParam(session, step, step.values[i], params[i])) return false;
+    Editor editor;
+    Catalogue catalogue(session.module(), editor);
+    try {
+        session.sentence = catalogue.sentence(step.kind, step.code, params);
+    } catch (const std::exception& e) {
+        return session.fail(step, e.what());
+    }
+    session.show(step, toUtf8(*session.sentence));
+    return true;
+}
+
 // echo takes the rest of its line as it is.
 std::string parseEcho(const std::vector<Token>&, Step&) {
     return std::string();
@@ -206,6 +236,7 @@ const Command Commands[] = {
     {"echo", true, parseEcho, runEcho},           {"new", false, parseNothing, runNew},
     {"buffers", false, parseBuffers, runBuffers}, {"poke", false, parsePoke, runPoke},
     {"reg", false, parseRegistry, runRegistry},   {"layer", false, parseLayer, runLayer},
+    {"show", false, parseShow, runShow},
 };
 
 }  // namespace

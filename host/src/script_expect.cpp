@@ -201,6 +201,26 @@ bool checkCurrentKey(Session& s, const Step& step, std::string& why) {
     return same;
 }
 
+// A text operand.
+std::string parseText(const std::vector<Token>& operands, Step& step) {
+    if (operands.size() != 1 || !operands[0].quoted) return "expect " + step.subject + " needs a text";
+    Value value;
+    value.kind = Value::Kind::Text;
+    value.text = operands[0].text;
+    step.values.push_back(value);
+    return std::string();
+}
+
+bool checkSentence(Session& s, const Step& step, std::string& why) {
+    if (!s.sentence) {
+        why = "expect sentence with no show line before it";
+        return false;
+    }
+    bool same = *s.sentence == step.values[0].text;
+    if (!same) why = "expected the sentence " + quote(step.values[0].text) + ", got " + quote(*s.sentence);
+    return same;
+}
+
 const Subject Subjects[] = {
     {"result", true, parseResult, checkResult},
     {"error", false, parseInteger1, checkError},
@@ -211,6 +231,7 @@ const Subject Subjects[] = {
     {"rootKeyIndex", false, parseInteger1, checkRootKeyIndex},
     {"use64BitView", false, parseInteger1, checkUse64BitView},
     {"currentKey", false, parseTextOrNull, checkCurrentKey},
+    {"sentence", false, parseText, checkSentence},
 };
 
 }  // namespace

@@ -59,6 +59,7 @@ public:
     Session(Module& module, const std::string& file, std::ostream& out, std::ostream& err,
             bool layer);
     Instance& instance() { return *instance_; }
+    Module& module() { return module_; }
     void freshInstance();
     // Reports a failure of `step` as "file:line: message"; returns false for the caller to pass on.
     bool fail(const Step& step, const std::string& message);
@@ -76,6 +77,7 @@ public:
     unsigned skipped = 0;
     const bool layer;                   // the portable layer's test control is there
     std::vector<LayerCall> eventCalls;  // what the layer served during the last event
+    std::optional<std::u16string> sentence;  // what the last `show` line printed
     LayerChanges layerChanges;
 
 private:
