@@ -60,6 +60,7 @@ namespace w32test {
 
 void resetAllocations();
 void resetRegistry() __attribute__((weak));
+void resetFiles();
 
 void reset() {
     setJournal(true);
@@ -67,6 +68,7 @@ void reset() {
     clearFaults();
     SetLastError(0);
     if (resetRegistry) resetRegistry();
+    resetFiles();
 }
 
 const std::vector<Call>& journal() { return state().journal; }
