@@ -206,6 +206,8 @@ const Command Commands[] = {
     {"echo", true, parseEcho, runEcho},           {"new", false, parseNothing, runNew},
     {"buffers", false, parseBuffers, runBuffers}, {"poke", false, parsePoke, runPoke},
     {"reg", false, parseRegistry, runRegistry},   {"layer", false, parseLayer, runLayer},
+    {"save", false, parseStateFile, runStateFile}, {"load", false, parseStateFile, runStateFile},
+    {"file", false, parseFileBytes, runFileBytes}, {"debug", false, parseNothing, runDebug},
 };
 
 }  // namespace
