@@ -4,6 +4,7 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <random>
 
 #include "internal.h"
 
@@ -52,11 +53,12 @@ int runState(Module& module, const char* entry, void* record, const std::string&
     return call(record, file.handle()) ? 1 : 0;
 }
 
-// A fresh file name in the system's temporary folder.
+// A fresh file name in the system's temporary folder; test programs run side by side, so the
+// name carries a random part besides the serial.
 std::string temporaryPath() {
+    static const unsigned process = std::random_device{}();
     static std::atomic<unsigned> serial{0};
-    auto name = "hivelet-state-" + std::to_string(reinterpret_cast<uintptr_t>(&serial) & 0xFFFF) +
-                "-" + std::to_string(++serial) + ".bin";
+    auto name = "hivelet-state-" + std::to_string(process) + "-" + std::to_string(++serial) + ".bin";
     return (std::filesystem::temp_directory_path() / name).u8string();
 }
 
