@@ -9,16 +9,18 @@ if(HV_SANITIZE)
   add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
   add_link_options(-fsanitize=address,undefined)
 endif()
-# The host and the module declare their own types for the calls between them, as two separate
-# programs would; clang's function-type check would flag every such call.
-if((HV_SANITIZE OR HV_FUZZ) AND CMAKE_CXX_COMPILER_ID MATCHES "Clang")
-  add_compile_options(-fno-sanitize=function)
-endif()
 
 if(HV_FUZZ)
   add_compile_options(-fsanitize=fuzzer-no-link,address,undefined -fno-sanitize-recover=all
                       -fno-omit-frame-pointer)
   add_link_options(-fsanitize=address,undefined)
+endif()
+
+# The host and the module declare their own types for the calls between them, as two separate
+# programs would; clang's function-type check would flag every such call. It comes after the
+# sanitizer options, which would turn the check back on.
+if((HV_SANITIZE OR HV_FUZZ) AND CMAKE_CXX_COMPILER_ID MATCHES "Clang")
+  add_compile_options(-fno-sanitize=function)
 endif()
 
 if(WIN32)

@@ -15,6 +15,7 @@ const char Usage[] =
     "usage: hivelet-host run [--module PATH] SCRIPT...\n"
     "       hivelet-host check SCRIPT...\n"
     "       hivelet-host menus [--module PATH]\n"
+    "       hivelet-host dump-state FILE\n"
     "       hivelet-host --help\n"
     "\n"
     "Plays the authoring host for the Hivelet module: loads it, creates an instance per\n"
@@ -25,6 +26,8 @@ const char Usage[] =
     "  check   only parse the scripts and report malformed lines\n"
     "  menus   print the editor's view of the events: the three menus as trees, each event\n"
     "          with its code, display text and parameter titles\n"
+    "  dump-state  print a saved-state file (version, root key, last error, key); a\n"
+    "              malformed file gives a message and exit status 1\n"
     "  --module PATH   the module to load; by default $HIVELET_MODULE, or else Hivelet.hzx\n"
     "                  beside this program\n"
     "\n"
@@ -130,6 +133,28 @@ int checkCommand(const std::vector<std::string>& args, std::ostream& out, std::o
     return failed ? 1 : 0;
 }
 
+// `dump-state`: a saved-state file, readably, or why it is not one.
+int dumpStateCommand(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
+    if (args.size() != 2) return usageError(err, "dump-state needs one file");
+    const std::string& path = args[1];
+    std::ifstream file(path, std::ios::binary);
+    std::vector<uint8_t> bytes((std::istreambuf_iterator<char>(file)),
+                               std::istreambuf_iterator<char>());
+    SavedState state;
+    std::string error;
+    if (!file) error = "cannot read the file";
+    if (error.empty() && readSavedState(bytes, state, &error)) {
+        const char* root = rootKeyName(state.rootKeyIndex);
+        out << "version " << state.version << "\nroot key index " << state.rootKeyIndex << " ("
+            << (*root ? root : "invalid") << ")\nlast error " << state.lastError << "\n"
+            << (state.hasKey ? "key " + quote(state.key) : std::string("no current key"))
+            << std::endl;
+        return 0;
+    }
+    err << path << ": " << error << std::endl;
+    return 1;
+}
+
 }  // namespace
 
 int commandLine(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
@@ -142,6 +167,7 @@ int commandLine(const std::vector<std::string>& args, std::ostream& out, std::os
     if (command == "run") return runCommand(args, out, err);
     if (command == "check") return checkCommand(args, out, err);
     if (command == "menus") return menusCommand(args, out, err);
+    if (command == "dump-state") return dumpStateCommand(args, out, err);
     return usageError(err, "unknown command " + command);
 }
 

@@ -237,6 +237,8 @@ const Command Commands[] = {
     {"buffers", false, parseBuffers, runBuffers}, {"poke", false, parsePoke, runPoke},
     {"reg", false, parseRegistry, runRegistry},   {"layer", false, parseLayer, runLayer},
     {"show", false, parseShow, runShow},
+    {"save", false, parseStateFile, runStateFile}, {"load", false, parseStateFile, runStateFile},
+    {"file", false, parseFileBytes, runFileBytes}, {"debug", false, parseNothing, runDebug},
 };
 
 }  // namespace

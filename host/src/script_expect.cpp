@@ -55,7 +55,7 @@ std::string parseResult(const std::vector<Token>& operands, Step& step) {
         std::string error = parseInteger(t.word, value.integer);
         if (!error.empty())
             return "expect takes a text, an integer, true, false or one of: error, message, "
-                   "fetches, buffers, address, rootKeyIndex, currentKey, use64BitView; not '" +
+                   "fetches, buffers, address, rootKeyIndex, currentKey, use64BitView, debug, file; not '" +
                    t.word + "'";
     }
     step.values.push_back(value);
@@ -232,6 +232,8 @@ const Subject Subjects[] = {
     {"use64BitView", false, parseInteger1, checkUse64BitView},
     {"currentKey", false, parseTextOrNull, checkCurrentKey},
     {"sentence", false, parseText, checkSentence},
+    {"debug", false, parseDebugExpect, checkDebug},
+    {"file", false, parseFileExpect, checkFile},
 };
 
 }  // namespace

@@ -32,6 +32,10 @@ std::string scanInteger(const std::string& word, IntegerDigits& number);
 std::string parseInteger(const std::string& word, int64_t& value);
 // Reads an event parameter; returns an error or "".
 std::string parseParameter(const Token& token, Value& value);
+// Bytes as "[61 00 ff]".
+std::string hexList(const std::vector<uint8_t>& bytes);
+// Hex bytes written as pairs of digits, blanks allowed between whole bytes: "01 02ff".
+std::string parseHex(const std::u16string& text, std::vector<uint8_t>& data);
 // A value as the script writes it.
 std::string describe(const Value& value);
 // The name of a predefined root by its index (HKEY_CLASSES_ROOT ...), or "" past the fifth.
@@ -113,6 +117,16 @@ std::string parseRegistry(const std::vector<Token>& operands, Step& step);
 bool runRegistry(Session& session, const Step& step);
 std::string parseLayer(const std::vector<Token>& operands, Step& step);
 bool runLayer(Session& session, const Step& step);
+// The state lines (script_state.cpp): save, load, file, debug, and their expectations.
+std::string parseStateFile(const std::vector<Token>& operands, Step& step);
+bool runStateFile(Session& session, const Step& step);
+std::string parseFileBytes(const std::vector<Token>& operands, Step& step);
+bool runFileBytes(Session& session, const Step& step);
+bool runDebug(Session& session, const Step& step);
+std::string parseDebugExpect(const std::vector<Token>& operands, Step& step);
+bool checkDebug(Session& session, const Step& step, std::string& why);
+std::string parseFileExpect(const std::vector<Token>& operands, Step& step);
+bool checkFile(Session& session, const Step& step, std::string& why);
 // Whether `word`, after `layer`, starts a line of the layer's own (deny, fail ...); `next` is
 // the word after it.
 bool isLayerVerb(const std::string& word, const std::string& next);

@@ -7,6 +7,39 @@
 
 namespace hv::script {
 
+// Bytes as "[61 00 ff]".
+std::string hexList(const std::vector<uint8_t>& bytes) {
+    static const char digits[] = "0123456789abcdef";
+    std::string out;
+    for (uint8_t b : bytes) {
+        if (!out.empty()) out += ' ';
+        out += digits[b >> 4];
+        out += digits[b & 15];
+    }
+    return "[" + out + "]";
+}
+
+// Hex bytes written as pairs of digits, blanks allowed between whole bytes: "01 02ff".
+std::string parseHex(const std::u16string& text, std::vector<uint8_t>& data) {
+    std::string ascii;
+    for (char16_t c : text) ascii += c < 0x80 ? static_cast<char>(c) : '?';
+    std::string bad =
+        "bad hex bytes '" + ascii + "' (pairs of hex digits, blanks only between bytes)";
+    size_t i = 0;
+    while (i < ascii.size()) {
+        if (ascii[i] == ' ' || ascii[i] == '\t') {
+            ++i;
+            continue;
+        }
+        if (i + 1 >= ascii.size() || !std::isxdigit(static_cast<unsigned char>(ascii[i])) ||
+            !std::isxdigit(static_cast<unsigned char>(ascii[i + 1])))
+            return bad;
+        data.push_back(static_cast<uint8_t>(std::stoul(ascii.substr(i, 2), nullptr, 16)));
+        i += 2;
+    }
+    return std::string();
+}
+
 namespace {
 
 // The operands of a line, read front to back.
@@ -70,18 +103,6 @@ std::string typeName(uint32_t type) {
     return "type " + std::to_string(type);
 }
 
-// Bytes as "[61 00 ff]".
-std::string hexList(const std::vector<uint8_t>& bytes) {
-    static const char digits[] = "0123456789abcdef";
-    std::string out;
-    for (uint8_t b : bytes) {
-        if (!out.empty()) out += ' ';
-        out += digits[b >> 4];
-        out += digits[b & 15];
-    }
-    return "[" + out + "]";
-}
-
 // Appends UTF-16 text as little-endian bytes, with its terminator.
 void appendText(std::vector<uint8_t>& data, const std::u16string& text) {
     for (char16_t unit : text) {
@@ -96,26 +117,6 @@ void appendLittleEndian(std::vector<uint8_t>& data, uint64_t value, int bytes) {
     for (int i = 0; i < bytes; ++i) data.push_back(static_cast<uint8_t>(value >> (8 * i)));
 }
 
-// Hex bytes written as pairs of digits, blanks allowed between whole bytes: "01 02ff".
-std::string parseHex(const std::u16string& text, std::vector<uint8_t>& data) {
-    std::string ascii;
-    for (char16_t c : text) ascii += c < 0x80 ? static_cast<char>(c) : '?';
-    std::string bad =
-        "bad hex bytes '" + ascii + "' (pairs of hex digits, blanks only between bytes)";
-    size_t i = 0;
-    while (i < ascii.size()) {
-        if (ascii[i] == ' ' || ascii[i] == '\t') {
-            ++i;
-            continue;
-        }
-        if (i + 1 >= ascii.size() || !std::isxdigit(static_cast<unsigned char>(ascii[i])) ||
-            !std::isxdigit(static_cast<unsigned char>(ascii[i + 1])))
-            return bad;
-        data.push_back(static_cast<uint8_t>(std::stoul(ascii.substr(i, 2), nullptr, 16)));
-        i += 2;
-    }
-    return std::string();
-}
 
 // A 64-bit integer: decimal from -9223372036854775808 to 18446744073709551615, or 0x with up
 // to sixteen hex digits.

@@ -356,4 +356,38 @@ TEST(CommandLine, UsageErrors) {
     EXPECT_TRUE(contains(err, "cannot load the module")) << err;
 }
 
+// dump-state prints a state file readably and refuses a malformed one with its reason.
+TEST(CommandLine, DumpState) {
+    const std::string header = std::string("\x01\0\0\0\x02\0\0\0\x05\0\0\0", 12);
+    const struct {
+        std::string bytes;
+        int status;
+        std::string shown;  // standard output, or the reason after "FILE: "
+    } rows[] = {
+        {header + std::string("\x06\0A\0B\0\0\0", 8), 0,
+         "version 1\nroot key index 2 (HKEY_CURRENT_USER)\nlast error 5\nkey \"AB\"\n"},
+        {header + std::string("\0\0", 2), 0,
+         "version 1\nroot key index 2 (HKEY_CURRENT_USER)\nlast error 5\nno current key\n"},
+        {std::string("\x01\0\0\0\x09\0\0\0\0\0\0\0\0\0", 14), 0,
+         "version 1\nroot key index 9 (invalid)\nlast error 0\nno current key\n"},
+        {header.substr(0, 11), 1, "too short for the 12-byte header (11 bytes)"},
+        {"\x02" + header.substr(1) + std::string("\0\0", 2), 1, "format version 2, not 1"},
+        {header, 1, "the key byte length is missing"},
+        {header + std::string("\x03\0A\0\0", 5), 1, "odd key byte length 3"},
+        {header + std::string("\x04\0A\0B\0", 6), 1, "the key text lacks its terminating zero"},
+        {header + std::string("\x06\0A\0", 4), 1, "the key text is cut short (2 of 6 bytes)"},
+        {header + std::string("\0\0\xde", 3), 1, "bytes after the record (1)"},
+    };
+    for (const auto& row : rows) {
+        std::string path = scriptFile("state.bin", row.bytes);
+        std::string out, err;
+        EXPECT_EQ(command({"dump-state", path}, &out, &err), row.status) << row.shown;
+        EXPECT_EQ(row.status ? err : out, row.status ? path + ": " + row.shown + "\n" : row.shown);
+    }
+    std::string err;
+    EXPECT_EQ(command({"dump-state", testing::TempDir() + "absent.bin"}, nullptr, &err), 1);
+    EXPECT_TRUE(contains(err, "absent.bin: cannot read the file")) << err;
+    EXPECT_EQ(command({"dump-state"}), 2);
+}
+
 }  // namespace

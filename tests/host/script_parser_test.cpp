@@ -299,6 +299,13 @@ const Malformed MalformedLines[] = {
     {"expect currentKey 5", "expect currentKey takes a text or null"},
     {"new now", "stray text 'now'"},
     {"buffers maybe", "buffers takes on or off"},
+    {"save state.bin", "save needs a file name in quotes"},
+    {"load \"a\" \"b\"", "load needs a file name in quotes"},
+    {"file \"a\" \"0g\"", "bad hex bytes '0g' (pairs of hex digits, blanks only between bytes)"},
+    {"debug 1", "stray text '1'"},
+    {"expect debug 1", "expect debug takes an item number and a text in quotes or untouched"},
+    {"expect debug x \"y\"", "bad integer 'x'"},
+    {"expect file \"a\"", "expect file needs a file name and hex bytes, both in quotes"},
     {"poke colour 1", "poke takes rootKeyIndex, lastError or use64BitView and an integer"},
     {"poke lastError", "poke lastError needs an integer"},
     {"reg", "reg takes key, value or expect"},
@@ -400,7 +407,7 @@ const Malformed MalformedLines[] = {
     {"layer expect calls RegOpenKeyExW 1 2", "stray text '2'"},
     {"layer expect nothing", "expect takes a text, an integer, true, false or one of: error, "
                                "message, fetches, buffers, address, rootKeyIndex, currentKey, "
-                               "use64BitView; not 'nothing'"},
+                               "use64BitView, debug, file; not 'nothing'"},
     {"}", "} without layer {"},
 };
 

@@ -330,3 +330,53 @@ static_assert(sizeof(OSVERSIONINFOEXW) == 284, "OSVERSIONINFOEXW is 284 bytes on
 
 W32_API BOOL WINAPI GetVersionExW(LPOSVERSIONINFOW lpVersionInformation);
 // ---- end of the registry section ----------------------------------------------------------
+
+// ---- Files (kernel32) and formatted text (user32) --------------------------------------
+// Synchronous files over POSIX descriptors: no overlapped I/O, no sharing modes enforced.
+#include <stdarg.h>
+#ifndef INVALID_HANDLE_VALUE
+#define INVALID_HANDLE_VALUE ((HANDLE)(LONG_PTR)-1)
+#endif
+#ifndef CREATE_NEW
+#define CREATE_NEW 1
+#define CREATE_ALWAYS 2
+#define OPEN_EXISTING 3
+#define OPEN_ALWAYS 4
+#define TRUNCATE_EXISTING 5
+#endif
+#ifndef FILE_SHARE_READ
+#define FILE_SHARE_READ 0x00000001
+#define FILE_SHARE_WRITE 0x00000002
+#define FILE_SHARE_DELETE 0x00000004
+#endif
+#ifndef FILE_ATTRIBUTE_NORMAL
+#define FILE_ATTRIBUTE_NORMAL 0x00000080
+#endif
+#ifndef ERROR_FILE_EXISTS
+#define ERROR_WRITE_FAULT 29L
+#define ERROR_READ_FAULT 30L
+#define ERROR_HANDLE_EOF 38L
+#define ERROR_FILE_EXISTS 80L
+#define ERROR_DISK_FULL 112L
+#endif
+
+typedef struct _OVERLAPPED OVERLAPPED, *LPOVERLAPPED;
+
+W32_API HANDLE WINAPI CreateFileW(LPCWSTR lpFileName, DWORD dwDesiredAccess, DWORD dwShareMode,
+                                  LPSECURITY_ATTRIBUTES lpSecurityAttributes,
+                                  DWORD dwCreationDisposition, DWORD dwFlagsAndAttributes,
+                                  HANDLE hTemplateFile);
+W32_API BOOL WINAPI CloseHandle(HANDLE hObject);
+W32_API BOOL WINAPI ReadFile(HANDLE hFile, LPVOID lpBuffer, DWORD nNumberOfBytesToRead,
+                             LPDWORD lpNumberOfBytesRead, LPOVERLAPPED lpOverlapped);
+W32_API BOOL WINAPI WriteFile(HANDLE hFile, LPCVOID lpBuffer, DWORD nNumberOfBytesToWrite,
+                              LPDWORD lpNumberOfBytesWritten, LPOVERLAPPED lpOverlapped);
+
+// wsprintfW is cdecl (the caller removes its arguments). Output stops at 1023 characters
+// plus the terminator, whatever the buffer; %s of a null address gives "(null)".
+#ifndef WINAPIV
+#define WINAPIV
+#endif
+W32_API int WINAPIV wsprintfW(LPWSTR buffer, LPCWSTR format, ...);
+W32_API int WINAPI wvsprintfW(LPWSTR buffer, LPCWSTR format, va_list arguments);
+// ---- end of the files section ------------------------------------------------------------

@@ -60,6 +60,7 @@ namespace w32test {
 
 void resetAllocations();
 void resetRegistry() __attribute__((weak));
+void resetFiles();
 
 void reset() {
     setJournal(true);
@@ -68,6 +69,7 @@ void reset() {
     SetLastError(0);
     resetMenus();
     if (resetRegistry) resetRegistry();
+    resetFiles();
 }
 
 const std::vector<Call>& journal() { return state().journal; }

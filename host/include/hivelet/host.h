@@ -163,6 +163,26 @@ public:
     void setLastError(uint32_t value);
     void setHeaderFlags(uint16_t value);
 
+    // The saved state through SaveRunObject and LoadRunObject, on a file handle the host opens
+    // (CreateFileW) and closes: the entry point's result, or -1 when the file cannot be opened
+    // (`error` then says why).
+    int saveState(const std::string& path, std::string* error = nullptr);
+    int loadState(const std::string& path, std::string* error = nullptr);
+    // The same through a temporary file: the bytes the module wrote, or the bytes to load.
+    int saveState(std::vector<uint8_t>& bytes);
+    int loadState(const std::vector<uint8_t>& bytes);
+
+    // One debugger line, as GetDebugItem leaves the host's 256-character line buffer: the
+    // buffer starts filled with 0xBEBE characters and has sentinels after it.
+    struct DebugLine {
+        std::vector<char16_t> buffer;  // all 256 characters as the module left them
+        bool written = false;          // some character changed
+        bool sentinelsIntact = true;
+        std::u16string text() const;   // up to the first zero, or all 256 without one
+    };
+    DebugLine debugLine(int item);
+    static constexpr size_t DebugLineChars = 256;
+
     // Host behaviour for the next events: lend no string buffer (GetStringBuffer gives null).
     void lendNoBuffer(bool on) { lendNoBuffer_ = on; }
 
@@ -234,6 +254,21 @@ private:
     unsigned hostVersionCalls_ = 0;
     std::vector<Insert> inserts_;
 };
+
+// A saved-state record read back from bytes, as the module writes it: the 12-byte header
+// (version, root key index, last error), the key's byte length, the key text with its
+// terminator. `hasKey` false: the record holds no current key.
+struct SavedState {
+    uint32_t version = 0;
+    uint32_t rootKeyIndex = 0;
+    uint32_t lastError = 0;
+    bool hasKey = false;
+    std::u16string key;
+};
+// Reads a file that holds exactly one record. A malformed one (too short, a version other than
+// 1, an odd key length, a key text without its final zero, bytes after the record) gives false
+// and the reason in `error`. The key is the text up to its first zero, as the module reads it.
+bool readSavedState(const std::vector<uint8_t>& bytes, SavedState& state, std::string* error);
 
 // UTF-8 <-> UTF-16 at the edges (scripts, transcripts). Malformed UTF-8 becomes U+FFFD.
 std::u16string fromUtf8(const std::string& text);

@@ -89,3 +89,26 @@ W32_TEST_API void setVersionFault(bool fail);
 W32_TEST_API void setPlatformId(DWORD id);
 
 }  // namespace w32test
+
+// ---- File test control -----------------------------------------------------------------
+// ReadFile and WriteFile are journaled as {hFile, lpBuffer, nNumberOfBytes, lpNumberOfBytes,
+// lpOverlapped} with the BOOL result; CreateFileW as {lpFileName, dwDesiredAccess,
+// dwCreationDisposition} with the handle; CloseHandle as {hObject}. failCall/failAlways with
+// "ReadFile", "WriteFile" or "CreateFileW" make the call fail with that code (last error) and
+// touch nothing: no byte is read or written and the reported count is 0.
+namespace w32test {
+
+// A file handle over an open descriptor (a pipe, a memfd, a temporary file); the handle owns
+// it from now on, and CloseHandle closes it.
+W32_TEST_API HANDLE fileHandleFromDescriptor(int fd);
+// Makes the nth WriteFile (1 = the next one) report success and 0 bytes written, writing
+// nothing.
+W32_TEST_API void silentWrite(unsigned nth);
+// Makes the nth ReadFile deliver `missing` bytes fewer than it asked for (all of them when
+// `missing` is at least the request) and report success with the count it delivered; the file
+// position moves only by what was delivered.
+W32_TEST_API void shortRead(unsigned nth, DWORD missing);
+// File handles open now.
+W32_TEST_API size_t openFileCount();
+
+}  // namespace w32test

@@ -1,0 +1,153 @@
+// The host's side of an instance's saved state and debugger lines, and the reader of state
+// files that hivelet-host dump-state uses.
+#include <atomic>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <random>
+
+#include "internal.h"
+
+namespace hv {
+
+namespace {
+
+using StateEntry = BOOL(WINAPI*)(void* record, HANDLE file);
+using DebugItemEntry = void(WINAPI*)(LPWSTR line, void* record, int item);
+
+const char16_t LineFill = 0xBEBE;
+const size_t HeaderBytes = 12;
+
+// A file handle the host owns for one call of the module.
+class HostFile {
+public:
+    HostFile(const std::string& path, bool writing) {
+        std::u16string name = fromUtf8(path);
+        handle_ = CreateFileW(wide(name), writing ? GENERIC_WRITE : GENERIC_READ,
+                              FILE_SHARE_READ, nullptr, writing ? CREATE_ALWAYS : OPEN_EXISTING,
+                              FILE_ATTRIBUTE_NORMAL, nullptr);
+        if (handle_ == INVALID_HANDLE_VALUE)
+            error_ = "cannot open " + path + " (error " + std::to_string(GetLastError()) + ")";
+    }
+    ~HostFile() {
+        if (handle_ != INVALID_HANDLE_VALUE) CloseHandle(handle_);
+    }
+    HostFile(const HostFile&) = delete;
+    HostFile& operator=(const HostFile&) = delete;
+    HANDLE handle() const { return handle_; }
+    const std::string& error() const { return error_; }
+
+private:
+    HANDLE handle_ = INVALID_HANDLE_VALUE;
+    std::string error_;
+};
+
+int runState(Module& module, const char* entry, void* record, const std::string& path,
+             bool writing, std::string* error) {
+    auto call = module.entry<StateEntry>(entry);
+    HostFile file(path, writing);
+    if (file.handle() == INVALID_HANDLE_VALUE) {
+        if (error) *error = file.error();
+        return -1;
+    }
+    return call(record, file.handle()) ? 1 : 0;
+}
+
+// A fresh file name in the system's temporary folder; test programs run side by side, so the
+// name carries a random part besides the serial.
+std::string temporaryPath() {
+    static const unsigned process = std::random_device{}();
+    static std::atomic<unsigned> serial{0};
+    auto name = "hivelet-state-" + std::to_string(process) + "-" + std::to_string(++serial) + ".bin";
+    return (std::filesystem::temp_directory_path() / name).u8string();
+}
+
+uint32_t u32At(const std::vector<uint8_t>& b, size_t at) {
+    return b[at] | b[at + 1] << 8 | b[at + 2] << 16 | static_cast<uint32_t>(b[at + 3]) << 24;
+}
+
+}  // namespace
+
+int Instance::saveState(const std::string& path, std::string* error) {
+    return runState(module_, "SaveRunObject", record_, path, true, error);
+}
+
+int Instance::loadState(const std::string& path, std::string* error) {
+    return runState(module_, "LoadRunObject", record_, path, false, error);
+}
+
+int Instance::saveState(std::vector<uint8_t>& bytes) {
+    std::string path = temporaryPath();
+    int result = saveState(path);
+    std::ifstream in(std::filesystem::u8path(path), std::ios::binary);
+    bytes.assign(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+    in.close();
+    std::filesystem::remove(std::filesystem::u8path(path));
+    return result;
+}
+
+int Instance::loadState(const std::vector<uint8_t>& bytes) {
+    std::string path = temporaryPath();
+    {
+        std::ofstream out(std::filesystem::u8path(path), std::ios::binary);
+        out.write(reinterpret_cast<const char*>(bytes.data()),
+                  static_cast<std::streamsize>(bytes.size()));
+    }
+    int result = loadState(path);
+    std::filesystem::remove(std::filesystem::u8path(path));
+    return result;
+}
+
+std::u16string Instance::DebugLine::text() const {
+    std::u16string t;
+    for (char16_t c : buffer) {
+        if (c == 0) break;
+        t += c;
+    }
+    return t;
+}
+
+Instance::DebugLine Instance::debugLine(int item) {
+    auto get = module_.entry<DebugItemEntry>("GetDebugItem");
+    std::vector<char16_t> store(DebugLineChars + fill::guardSize, LineFill);
+    get(reinterpret_cast<LPWSTR>(store.data()), record_, item);
+    DebugLine line;
+    line.buffer.assign(store.begin(), store.begin() + DebugLineChars);
+    for (char16_t c : line.buffer) line.written = line.written || c != LineFill;
+    for (size_t i = DebugLineChars; i < store.size(); ++i)
+        line.sentinelsIntact = line.sentinelsIntact && store[i] == LineFill;
+    return line;
+}
+
+bool readSavedState(const std::vector<uint8_t>& b, SavedState& state, std::string* error) {
+    auto refuse = [error](const std::string& why) {
+        if (error) *error = why;
+        return false;
+    };
+    if (b.size() < HeaderBytes)
+        return refuse("too short for the 12-byte header (" + std::to_string(b.size()) + " bytes)");
+    state.version = u32At(b, 0);
+    state.rootKeyIndex = u32At(b, 4);
+    state.lastError = u32At(b, 8);
+    if (state.version != 1) return refuse("format version " + std::to_string(state.version) + ", not 1");
+    if (b.size() < HeaderBytes + 2) return refuse("the key byte length is missing");
+    size_t keyBytes = b[12] | b[13] << 8;
+    size_t end = HeaderBytes + 2 + keyBytes;
+    if (keyBytes % 2) return refuse("odd key byte length " + std::to_string(keyBytes));
+    if (b.size() < end)
+        return refuse("the key text is cut short (" + std::to_string(b.size() - HeaderBytes - 2) +
+                      " of " + std::to_string(keyBytes) + " bytes)");
+    if (b.size() > end) return refuse("bytes after the record (" + std::to_string(b.size() - end) + ")");
+    state.hasKey = keyBytes != 0;
+    state.key.clear();
+    if (!state.hasKey) return true;
+    if (b[end - 1] != 0 || b[end - 2] != 0) return refuse("the key text lacks its terminating zero");
+    for (size_t at = HeaderBytes + 2; at + 2 <= end; at += 2) {
+        char16_t unit = static_cast<char16_t>(b[at] | b[at + 1] << 8);
+        if (unit == 0) break;
+        state.key += unit;
+    }
+    return true;
+}
+
+}  // namespace hv
