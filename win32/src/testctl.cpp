@@ -60,6 +60,7 @@ namespace w32test {
 
 void resetAllocations();
 void resetRegistry() __attribute__((weak));
+void resetWindows() __attribute__((weak));
 
 void reset() {
     setJournal(true);
@@ -67,6 +68,7 @@ void reset() {
     clearFaults();
     SetLastError(0);
     if (resetRegistry) resetRegistry();
+    if (resetWindows) resetWindows();
 }
 
 const std::vector<Call>& journal() { return state().journal; }
