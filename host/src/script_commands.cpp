@@ -206,6 +206,7 @@ const Command Commands[] = {
     {"echo", true, parseEcho, runEcho},           {"new", false, parseNothing, runNew},
     {"buffers", false, parseBuffers, runBuffers}, {"poke", false, parsePoke, runPoke},
     {"reg", false, parseRegistry, runRegistry},   {"layer", false, parseLayer, runLayer},
+    {"param", false, parseParam, runParam},
 };
 
 }  // namespace

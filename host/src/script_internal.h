@@ -53,6 +53,8 @@ struct LayerChanges {
     std::vector<RegistryLine> denials;
 };
 
+struct ParamState;
+
 // The state of one running script: its instance and the last event's outcome.
 class Session {
 public:
@@ -77,6 +79,8 @@ public:
     const bool layer;                   // the portable layer's test control is there
     std::vector<LayerCall> eventCalls;  // what the layer served during the last event
     LayerChanges layerChanges;
+    std::shared_ptr<ParamState> param;  // the root-key parameter record, once a param line ran
+    Module& module() { return module_; }
 
 private:
     Module& module_;
@@ -111,6 +115,9 @@ std::string parseRegistry(const std::vector<Token>& operands, Step& step);
 bool runRegistry(Session& session, const Step& step);
 std::string parseLayer(const std::vector<Token>& operands, Step& step);
 bool runLayer(Session& session, const Step& step);
+// The root-key parameter lines (script_param.cpp).
+std::string parseParam(const std::vector<Token>& operands, Step& step);
+bool runParam(Session& session, const Step& step);
 // Whether `word`, after `layer`, starts a line of the layer's own (deny, fail ...); `next` is
 // the word after it.
 bool isLayerVerb(const std::string& word, const std::string& next);

@@ -20,6 +20,7 @@ const char* const FailableFunctions[] = {
     "RegDeleteKeyW",   "RegDeleteKeyExW", "RegDeleteValueW",  "RegEnumKeyExW",
     "RegCloseKey",     "GetVersionExW",   "LoadLibraryW",     "GetProcAddress",
     "FormatMessageW",  "LoadStringW",     "calloc",           "malloc",
+    "DialogBoxParamW",
 };
 
 // The access-mask argument of the calls that take one, by position in the journal.
