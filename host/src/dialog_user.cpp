@@ -84,6 +84,7 @@ std::string describe(const UserStep& step) {
         case UserStep::Action::Enter: return "enter";
         case UserStep::Action::Escape: return "escape";
         case UserStep::Action::CloseBox: return "close";
+        case UserStep::Action::Wait: return "wait " + std::to_string(step.index);
     }
     return "?";
 }
@@ -119,7 +120,9 @@ void ScriptedUser::tick() {
     if (next_ > seen_.openAfter.size()) seen_.openAfter.push_back(true);
     if (HWND list = GetDlgItem(dialog, listId_))
         seen_.lastSelection = static_cast<int>(SendMessageW(list, LB_GETCURSEL, 0, 0));
-    if (next_ < steps_.size()) {
+    if (idleTicks_ > 0) {
+        --idleTicks_;
+    } else if (next_ < steps_.size()) {
         perform(dialog, steps_[next_++]);
     } else if (!cancelled_) {
         // Nothing left to do, and the dialog is still there: leave it as Cancel would.
@@ -155,6 +158,7 @@ void ScriptedUser::perform(HWND dialog, const UserStep& step) {
         case UserStep::Action::Enter: pressKey(dialog, VK_RETURN, 0x1C); break;
         case UserStep::Action::Escape: pressKey(dialog, VK_ESCAPE, 0x01); break;
         case UserStep::Action::CloseBox: PostMessageW(dialog, WM_SYSCOMMAND, SC_CLOSE, 0); break;
+        case UserStep::Action::Wait: idleTicks_ = step.index / static_cast<int>(TickPeriod); break;
     }
 }
 

@@ -51,14 +51,14 @@ std::string parseSteps(const std::vector<Token>& ops, size_t from, Step& step) {
         const std::string& w = ops[i].word;
         if (ops[i].quoted) return "a dialog step is a word, not " + quote(ops[i].text);
         step.values.push_back(word(w));
-        if (w == "select" || w == "double") {
-            if (++i == ops.size()) return w + " needs a list position";
+        if (w == "select" || w == "double" || w == "wait") {
+            if (++i == ops.size()) return w + (w == "wait" ? " needs milliseconds" : " needs a list position");
             Value n;
             if (std::string e = integerOperand(ops[i], n); !e.empty()) return e;
             step.values.push_back(n);
         } else if (w != "ok" && w != "cancel" && w != "enter" && w != "escape" && w != "close") {
             return "unknown dialog step '" + w +
-                   "' (select N, double N, ok, cancel, enter, escape or close)";
+                   "' (select N, double N, ok, cancel, enter, escape, close or wait MS)";
         }
     }
     return std::string();
@@ -68,9 +68,10 @@ std::vector<UserStep> stepsOf(const Step& step) {
     std::vector<UserStep> steps;
     for (size_t i = 0; i < step.values.size(); ++i) {
         const std::string& w = step.values[i].word;
-        if (w == "select" || w == "double") {
+        if (w == "select" || w == "double" || w == "wait") {
             auto n = static_cast<int>(step.values[++i].integer);
-            steps.push_back(w == "select" ? UserStep::select(n) : UserStep::doubleClick(n));
+            steps.push_back(w == "select" ? UserStep::select(n)
+                            : w == "double" ? UserStep::doubleClick(n) : UserStep::wait(n));
         }
         if (w == "ok") steps.push_back(UserStep::ok());
         if (w == "cancel") steps.push_back(UserStep::cancel());

@@ -13,9 +13,9 @@
 namespace hv {
 
 struct UserStep {
-    enum class Action { Select, DoubleClick, Ok, Cancel, Enter, Escape, CloseBox };
+    enum class Action { Select, DoubleClick, Ok, Cancel, Enter, Escape, CloseBox, Wait };
     Action action = Action::Ok;
-    int index = 0;  // list position, for Select and DoubleClick
+    int index = 0;  // list position, for Select and DoubleClick; milliseconds, for Wait
 
     static UserStep select(int index) { return {Action::Select, index}; }
     static UserStep doubleClick(int index) { return {Action::DoubleClick, index}; }
@@ -24,6 +24,8 @@ struct UserStep {
     static UserStep enter() { return {Action::Enter, 0}; }
     static UserStep escape() { return {Action::Escape, 0}; }
     static UserStep closeBox() { return {Action::CloseBox, 0}; }
+    // Does nothing for about this long (a whole number of ticks), e.g. to show the dialog.
+    static UserStep wait(int milliseconds) { return {Action::Wait, milliseconds}; }
 };
 
 // "select 4", "ok", "enter", "close" ...; the words a script writes.
@@ -83,6 +85,7 @@ private:
     UINT_PTR timer_ = 0;
     HWND dialog_ = nullptr;
     bool cancelled_ = false;
+    int idleTicks_ = 0;  // ticks left of a Wait step
     DialogSeen seen_;
 };
 
