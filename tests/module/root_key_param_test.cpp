@@ -104,6 +104,7 @@ TEST_F(RootKeyParam, DialogThatCannotBeCreated) {
     HV_NEEDS_TEST_CONTROL();
 #if HV_HAS_TEST_CONTROL
     w32test::failCall("DialogBoxParamW", 1, ERROR_NOT_ENOUGH_MEMORY);
+    editor.setWindow(reinterpret_cast<HWND>(0x5A5A0));
     param.setRecord(2);
     std::vector<uint8_t> before = param.recordBytes();
     hv::DialogSeen seen;
@@ -116,7 +117,7 @@ TEST_F(RootKeyParam, DialogThatCannotBeCreated) {
     auto calls = w32test::callsOf("DialogBoxParamW");
     ASSERT_EQ(calls.size(), 1u);
     EXPECT_EQ(calls[0].args[1], 101u);
-    EXPECT_EQ(calls[0].args[2], 0u);
+    EXPECT_EQ(calls[0].args[2], 0x5A5A0u);
     EXPECT_EQ(calls[0].args[4], reinterpret_cast<uintptr_t>(param.record()));
 #endif
 }

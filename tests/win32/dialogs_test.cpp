@@ -225,6 +225,8 @@ TEST_F(Dialogs, FocusGoesToTheFirstTabStopOnlyWhenInitReturnsTrue) {
     }
 }
 
+void CALLBACK doNothing(HWND, UINT, UINT_PTR, DWORD) {}
+
 TEST_F(Dialogs, LoopWithNothingToDeliverEndsTheDialog) {
     script.endOnOkOrCancel = false;
     SetLastError(0);
@@ -234,7 +236,7 @@ TEST_F(Dialogs, LoopWithNothingToDeliverEndsTheDialog) {
     // A timer that never ends the dialog counts as nothing to deliver, too.
     script = Script{};
     script.endOnOkOrCancel = false;
-    script.onInit = [](HWND) { SetTimer(nullptr, 0, 10, [](HWND, UINT, UINT_PTR, DWORD) {}); };
+    script.onInit = [](HWND) { SetTimer(nullptr, 0, 10, doNothing); };
     EXPECT_EQ(run(), -1);
     EXPECT_EQ(w32test::count("ModalLoopStalled"), 2u);
 }
