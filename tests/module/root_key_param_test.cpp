@@ -122,6 +122,27 @@ TEST_F(RootKeyParam, DialogThatCannotBeCreated) {
 #endif
 }
 
+// The procedure keeps the address of the record's index (byte 6) in the user slot and adds the
+// names one by one; 32-bit code has only SetWindowLongW, whose index 8 is that slot.
+TEST_F(RootKeyParam, DialogKeepsTheIndexAddressAndAddsTheNames) {
+    HV_NEEDS_TEST_CONTROL();
+#if HV_HAS_TEST_CONTROL
+    param.setRecord(1);
+    EXPECT_EQ(param.edit({UserStep::cancel()}), 0);
+    const char* setter = sizeof(void*) == 4 ? "SetWindowLongW" : "SetWindowLongPtrW";
+    auto sets = w32test::callsOf(setter);
+    ASSERT_EQ(sets.size(), 1u);
+    EXPECT_EQ(sets[0].args[1], static_cast<uint64_t>(sizeof(void*) == 4 ? 8 : 16));
+    // Signed values are journaled sign-extended; an address is compared at its own width.
+    EXPECT_EQ(static_cast<uintptr_t>(sets[0].args[2]), reinterpret_cast<uintptr_t>(param.record() + 6));
+    std::vector<std::u16string> added;
+    for (const w32test::Call& c : w32test::callsOf("SendMessageW"))
+        if (c.args[1] == LB_ADDSTRING)
+            added.push_back(hvtest::text(reinterpret_cast<const WCHAR*>(static_cast<uintptr_t>(c.args[3]))));
+    EXPECT_EQ(added, RootNames);
+#endif
+}
+
 TEST_F(RootKeyParam, NameIsCopiedOverTheWholeCapacity) {
     param.setRecord(1);
     hv::ParamEditor::Text t = param.string(64);
