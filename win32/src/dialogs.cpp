@@ -579,9 +579,11 @@ LONG_PTR WINAPI SetWindowLongPtrW(HWND window, int index, LONG_PTR value) {
 
 BOOL WINAPI IsWindow(HWND window) { return find(window) != nullptr; }
 
+// A control's dialog; for a dialog, its owner when it is a popup, as on Windows.
 HWND WINAPI GetParent(HWND window) {
     Window* w = findOrFail(window);
-    return w && w->kind != Kind::Dialog ? w->parent : nullptr;
+    if (!w || (w->kind == Kind::Dialog && !(w->style & WS_POPUP))) return nullptr;
+    return w->parent;
 }
 
 int WINAPI GetWindowTextW(HWND window, LPWSTR text, int maxCount) {
