@@ -239,6 +239,7 @@ const Command Commands[] = {
     {"show", false, parseShow, runShow},
     {"save", false, parseStateFile, runStateFile}, {"load", false, parseStateFile, runStateFile},
     {"file", false, parseFileBytes, runFileBytes}, {"debug", false, parseNothing, runDebug},
+    {"param", false, parseParam, runParam},
 };
 
 }  // namespace

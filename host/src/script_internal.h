@@ -57,6 +57,8 @@ struct LayerChanges {
     std::vector<RegistryLine> denials;
 };
 
+struct ParamState;
+
 // The state of one running script: its instance and the last event's outcome.
 class Session {
 public:
@@ -83,6 +85,7 @@ public:
     std::vector<LayerCall> eventCalls;  // what the layer served during the last event
     std::optional<std::u16string> sentence;  // what the last `show` line printed
     LayerChanges layerChanges;
+    std::shared_ptr<ParamState> param;  // the root-key parameter record, once a param line ran
 
 private:
     Module& module_;
@@ -127,6 +130,9 @@ std::string parseDebugExpect(const std::vector<Token>& operands, Step& step);
 bool checkDebug(Session& session, const Step& step, std::string& why);
 std::string parseFileExpect(const std::vector<Token>& operands, Step& step);
 bool checkFile(Session& session, const Step& step, std::string& why);
+// The root-key parameter lines (script_param.cpp).
+std::string parseParam(const std::vector<Token>& operands, Step& step);
+bool runParam(Session& session, const Step& step);
 // Whether `word`, after `layer`, starts a line of the layer's own (deny, fail ...); `next` is
 // the word after it.
 bool isLayerVerb(const std::string& word, const std::string& next);

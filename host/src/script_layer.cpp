@@ -21,6 +21,7 @@ const char* const FailableFunctions[] = {
     "RegCloseKey",     "GetVersionExW",   "LoadLibraryW",     "GetProcAddress",
     "FormatMessageW",  "LoadStringW",     "calloc",           "malloc",
     "ReadFile",        "WriteFile",
+    "DialogBoxParamW",
 };
 
 // The access-mask argument of the calls that take one, by position in the journal.

@@ -380,3 +380,157 @@ W32_API BOOL WINAPI WriteFile(HANDLE hFile, LPCVOID lpBuffer, DWORD nNumberOfByt
 W32_API int WINAPIV wsprintfW(LPWSTR buffer, LPCWSTR format, ...);
 W32_API int WINAPI wvsprintfW(LPWSTR buffer, LPCWSTR format, va_list arguments);
 // ---- end of the files section ------------------------------------------------------------
+
+// ---- Windows, dialogs, list boxes, buttons and timers (user32) ---------------------------
+// Modal dialogs from classic DLGTEMPLATE resources, with the dialog manager's default handling
+// and keyboard, list boxes, push buttons, thread and window timers, and posted messages. The
+// layer's windows belong to the thread that created them and are used from that thread only.
+
+typedef INT_PTR(CALLBACK* DLGPROC)(HWND, UINT, WPARAM, LPARAM);
+typedef void(CALLBACK* TIMERPROC)(HWND, UINT, UINT_PTR, DWORD);
+typedef BOOL(CALLBACK* WNDENUMPROC)(HWND, LPARAM);
+
+#ifndef MAKELONG
+#define MAKELONG(a, b) ((LONG)(((WORD)((DWORD_PTR)(a) & 0xffff)) | ((DWORD)((WORD)((DWORD_PTR)(b) & 0xffff))) << 16))
+#endif
+#ifndef MAKEWPARAM
+#define MAKEWPARAM(l, h) ((WPARAM)(DWORD)MAKELONG(l, h))
+#endif
+#ifndef MAKELPARAM
+#define MAKELPARAM(l, h) ((LPARAM)(DWORD)MAKELONG(l, h))
+#endif
+#ifndef IS_INTRESOURCE
+#define IS_INTRESOURCE(r) ((((ULONG_PTR)(r)) >> 16) == 0)
+#endif
+
+#ifndef ERROR_INVALID_WINDOW_HANDLE
+#define ERROR_INVALID_WINDOW_HANDLE 1400L
+#endif
+#define ERROR_INVALID_INDEX 1413L
+#define ERROR_CONTROL_ID_NOT_FOUND 1421L
+#define ERROR_TIMEOUT 1460L
+
+#ifndef IDOK
+#define IDOK 1
+#endif
+#ifndef IDCANCEL
+#define IDCANCEL 2
+#endif
+
+// Shared with other sections (guarded above where another may define them first).
+// Window and control styles.
+#define WS_POPUP 0x80000000L
+#define WS_CHILD 0x40000000L
+#define WS_VISIBLE 0x10000000L
+#define WS_DISABLED 0x08000000L
+#define WS_CAPTION 0x00C00000L
+#define WS_BORDER 0x00800000L
+#define WS_VSCROLL 0x00200000L
+#define WS_SYSMENU 0x00080000L
+#define WS_GROUP 0x00020000L
+#define WS_TABSTOP 0x00010000L
+#define DS_SETFONT 0x40L
+#define DS_MODALFRAME 0x80L
+#define BS_PUSHBUTTON 0x0L
+#define BS_DEFPUSHBUTTON 0x1L
+#define BS_TYPEMASK 0xFL
+#define LBS_NOTIFY 0x1L
+#define LBS_SORT 0x2L
+#define LBS_NOINTEGRALHEIGHT 0x100L
+
+// Window messages.
+#define WM_DESTROY 0x0002
+#define WM_SETFOCUS 0x0007
+#define WM_SETTEXT 0x000C
+#define WM_GETTEXT 0x000D
+#define WM_GETTEXTLENGTH 0x000E
+#ifndef WM_CLOSE
+#define WM_CLOSE 0x0010
+#endif
+#ifndef WM_KEYDOWN
+#define WM_KEYDOWN 0x0100
+#endif
+#ifndef WM_KEYUP
+#define WM_KEYUP 0x0101
+#endif
+#define WM_CHAR 0x0102
+#ifndef WM_INITDIALOG
+#define WM_INITDIALOG 0x0110
+#endif
+#ifndef WM_COMMAND
+#define WM_COMMAND 0x0111
+#endif
+#ifndef WM_SYSCOMMAND
+#define WM_SYSCOMMAND 0x0112
+#endif
+#define WM_TIMER 0x0113
+#ifndef WM_USER
+#define WM_USER 0x0400
+#endif
+#define SC_CLOSE 0xF060
+#define VK_TAB 0x09
+#define VK_RETURN 0x0D
+#define VK_ESCAPE 0x1B
+
+// Dialog manager.
+#define DM_GETDEFID (WM_USER + 0)
+#define DC_HASDEFID 0x534B
+#define DWLP_MSGRESULT 0
+#define DWLP_DLGPROC (DWLP_MSGRESULT + (int)sizeof(LRESULT))
+#define DWLP_USER (DWLP_DLGPROC + (int)sizeof(DLGPROC))
+#if !defined(__x86_64__)
+#define DWL_MSGRESULT 0
+#define DWL_DLGPROC 4
+#define DWL_USER 8
+#endif
+#define GWL_STYLE (-16)
+#define GWLP_ID (-12)
+
+// Buttons and list boxes.
+#define BM_CLICK 0x00F5
+#define BN_CLICKED 0
+#define LB_ADDSTRING 0x0180
+#define LB_INSERTSTRING 0x0181
+#define LB_DELETESTRING 0x0182
+#define LB_RESETCONTENT 0x0184
+#define LB_SETCURSEL 0x0186
+#define LB_GETCURSEL 0x0188
+#define LB_GETTEXT 0x0189
+#define LB_GETTEXTLEN 0x018A
+#define LB_GETCOUNT 0x018B
+#define LB_OKAY 0
+#define LB_ERR (-1)
+#define LB_ERRSPACE (-2)
+#define LBN_SELCHANGE 1
+#define LBN_DBLCLK 2
+
+W32_API INT_PTR WINAPI DialogBoxParamW(HINSTANCE instance, LPCWSTR templateName, HWND owner,
+                                       DLGPROC dialogProc, LPARAM initParam);
+W32_API BOOL WINAPI EndDialog(HWND dialog, INT_PTR result);
+W32_API HWND WINAPI GetDlgItem(HWND dialog, int id);
+W32_API int WINAPI GetDlgCtrlID(HWND window);
+W32_API LRESULT WINAPI SendMessageW(HWND window, UINT message, WPARAM wParam, LPARAM lParam);
+W32_API BOOL WINAPI PostMessageW(HWND window, UINT message, WPARAM wParam, LPARAM lParam);
+W32_API LONG WINAPI GetWindowLongW(HWND window, int index);
+W32_API LONG WINAPI SetWindowLongW(HWND window, int index, LONG value);
+#if defined(__x86_64__)
+W32_API LONG_PTR WINAPI GetWindowLongPtrW(HWND window, int index);
+W32_API LONG_PTR WINAPI SetWindowLongPtrW(HWND window, int index, LONG_PTR value);
+#else
+// As in Windows' own headers, 32-bit code has only the LONG forms.
+#define GetWindowLongPtrW GetWindowLongW
+#define SetWindowLongPtrW SetWindowLongW
+#endif
+W32_API BOOL WINAPI IsWindow(HWND window);
+W32_API HWND WINAPI GetParent(HWND window);
+W32_API int WINAPI GetWindowTextW(HWND window, LPWSTR text, int maxCount);
+W32_API int WINAPI GetClassNameW(HWND window, LPWSTR className, int maxCount);
+W32_API HWND WINAPI GetFocus(void);
+W32_API HWND WINAPI SetFocus(HWND window);
+W32_API HWND WINAPI GetActiveWindow(void);
+W32_API HWND WINAPI GetForegroundWindow(void);
+W32_API BOOL WINAPI EnumThreadWindows(DWORD threadId, WNDENUMPROC enumProc, LPARAM lParam);
+W32_API DWORD WINAPI GetCurrentThreadId(void);
+W32_API UINT_PTR WINAPI SetTimer(HWND window, UINT_PTR id, UINT elapse, TIMERPROC timerProc);
+W32_API BOOL WINAPI KillTimer(HWND window, UINT_PTR id);
+// ---- end of the window section ----------------------------------------------------------

@@ -61,6 +61,7 @@ namespace w32test {
 void resetAllocations();
 void resetRegistry() __attribute__((weak));
 void resetFiles();
+void resetWindows() __attribute__((weak));
 
 void reset() {
     setJournal(true);
@@ -70,6 +71,7 @@ void reset() {
     resetMenus();
     if (resetRegistry) resetRegistry();
     resetFiles();
+    if (resetWindows) resetWindows();
 }
 
 const std::vector<Call>& journal() { return state().journal; }

@@ -112,3 +112,20 @@ W32_TEST_API void shortRead(unsigned nth, DWORD missing);
 W32_TEST_API size_t openFileCount();
 
 }  // namespace w32test
+
+// ---- Window test control -----------------------------------------------------------------
+// DialogBoxParamW, EndDialog, GetDlgItem, SendMessageW, PostMessageW, the window-long functions,
+// SetTimer and KillTimer are journaled with their arguments in Windows' order; failCall/
+// failAlways("DialogBoxParamW", ...) make it return -1 with that last error and create nothing.
+// A modal loop left with no message and no timer while its dialog is open journals
+// "ModalLoopStalled" {dialog} and makes DialogBoxParamW return -1 (last error ERROR_TIMEOUT).
+namespace w32test {
+
+// Every window alive now (dialogs and their controls).
+W32_TEST_API std::vector<HWND> liveWindows();
+// Timers set and not yet killed (a dialog's window timers go with it).
+W32_TEST_API size_t pendingTimers();
+// Drops every window, posted message and timer; reset() calls it.
+W32_TEST_API void resetWindows();
+
+}  // namespace w32test

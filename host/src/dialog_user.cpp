@@ -1,0 +1,165 @@
+// The scripted user: one look or one step per timer tick.
+#include <hivelet/dialog_user.h>
+
+namespace hv {
+
+namespace {
+
+// The user at work on this thread; a thread timer's procedure gets no context of its own.
+thread_local ScriptedUser* activeUser = nullptr;
+
+// The tick period, in milliseconds: a user that needs a few ticks finishes in well under a second.
+const UINT TickPeriod = 10;
+
+std::u16string windowText(HWND window) {
+    WCHAR buffer[256] = {};
+    int n = GetWindowTextW(window, buffer, 256);
+    return std::u16string(reinterpret_cast<const char16_t*>(buffer), n > 0 ? n : 0);
+}
+
+std::u16string className(HWND window) {
+    WCHAR buffer[64] = {};
+    int n = GetClassNameW(window, buffer, 64);
+    return std::u16string(reinterpret_cast<const char16_t*>(buffer), n > 0 ? n : 0);
+}
+
+BOOL CALLBACK findDialog(HWND window, LPARAM found) {
+    if (className(window) != u"#32770") return TRUE;
+    *reinterpret_cast<HWND*>(found) = window;
+    return FALSE;
+}
+
+// The thread's dialog on top, or null.
+HWND threadDialog() {
+    HWND found = nullptr;
+    EnumThreadWindows(GetCurrentThreadId(), findDialog, reinterpret_cast<LPARAM>(&found));
+    return found;
+}
+
+std::vector<std::u16string> listItems(HWND list) {
+    std::vector<std::u16string> items;
+    auto count = static_cast<int>(SendMessageW(list, LB_GETCOUNT, 0, 0));
+    for (int i = 0; i < count; ++i) {
+        auto length = SendMessageW(list, LB_GETTEXTLEN, static_cast<WPARAM>(i), 0);
+        if (length < 0) break;
+        std::vector<WCHAR> text(static_cast<size_t>(length) + 1);
+        SendMessageW(list, LB_GETTEXT, static_cast<WPARAM>(i), reinterpret_cast<LPARAM>(text.data()));
+        items.emplace_back(reinterpret_cast<const char16_t*>(text.data()), static_cast<size_t>(length));
+    }
+    return items;
+}
+
+// A key pressed and released where the keyboard focus is, as the dialog manager receives it.
+void pressKey(HWND dialog, WPARAM key, UINT scanCode) {
+    HWND focus = GetFocus();
+    HWND target = focus && (focus == dialog || GetParent(focus) == dialog) ? focus : dialog;
+    auto down = static_cast<LPARAM>(1 | scanCode << 16);
+    auto up = static_cast<LPARAM>(static_cast<DWORD>(down) | 0xC0000000u);
+    PostMessageW(target, WM_KEYDOWN, key, down);
+    PostMessageW(target, WM_KEYUP, key, up);
+}
+
+void clickButton(HWND dialog, int id) {
+    if (HWND button = GetDlgItem(dialog, id)) SendMessageW(button, BM_CLICK, 0, 0);
+}
+
+// A click on a list item: the selection moves, and the list box tells its dialog.
+void clickItem(HWND dialog, int listId, int index, bool twice) {
+    HWND list = GetDlgItem(dialog, listId);
+    if (!list) return;
+    SendMessageW(list, LB_SETCURSEL, static_cast<WPARAM>(index), 0);
+    auto from = reinterpret_cast<LPARAM>(list);
+    SendMessageW(dialog, WM_COMMAND, MAKEWPARAM(listId, LBN_SELCHANGE), from);
+    if (twice) SendMessageW(dialog, WM_COMMAND, MAKEWPARAM(listId, LBN_DBLCLK), from);
+}
+
+}  // namespace
+
+std::string describe(const UserStep& step) {
+    switch (step.action) {
+        case UserStep::Action::Select: return "select " + std::to_string(step.index);
+        case UserStep::Action::DoubleClick: return "double " + std::to_string(step.index);
+        case UserStep::Action::Ok: return "ok";
+        case UserStep::Action::Cancel: return "cancel";
+        case UserStep::Action::Enter: return "enter";
+        case UserStep::Action::Escape: return "escape";
+        case UserStep::Action::CloseBox: return "close";
+        case UserStep::Action::Wait: return "wait " + std::to_string(step.index);
+    }
+    return "?";
+}
+
+ScriptedUser::ScriptedUser(std::vector<UserStep> steps, int listId)
+    : steps_(std::move(steps)), listId_(listId) {}
+
+ScriptedUser::~ScriptedUser() {
+    if (timer_) finish();
+}
+
+void ScriptedUser::start() {
+    activeUser = this;
+    timer_ = SetTimer(nullptr, 0, TickPeriod, &ScriptedUser::onTick);
+}
+
+void ScriptedUser::finish() {
+    if (timer_) KillTimer(nullptr, timer_);
+    timer_ = 0;
+    if (activeUser == this) activeUser = nullptr;
+    // A step that was not followed by another look closed the dialog.
+    if (next_ > seen_.openAfter.size()) seen_.openAfter.push_back(false);
+}
+
+void CALLBACK ScriptedUser::onTick(HWND, UINT, UINT_PTR, DWORD) {
+    if (activeUser) activeUser->tick();
+}
+
+void ScriptedUser::tick() {
+    HWND dialog = threadDialog();
+    if (!dialog) return;
+    if (!seen_.appeared) look(dialog);
+    if (next_ > seen_.openAfter.size()) seen_.openAfter.push_back(true);
+    if (HWND list = GetDlgItem(dialog, listId_))
+        seen_.lastSelection = static_cast<int>(SendMessageW(list, LB_GETCURSEL, 0, 0));
+    if (idleTicks_ > 0) {
+        --idleTicks_;
+    } else if (next_ < steps_.size()) {
+        perform(dialog, steps_[next_++]);
+    } else if (!cancelled_) {
+        // Nothing left to do, and the dialog is still there: leave it as Cancel would.
+        seen_.ranOut = true;
+        cancelled_ = true;
+        SendMessageW(dialog, WM_COMMAND, MAKEWPARAM(IDCANCEL, BN_CLICKED),
+                     reinterpret_cast<LPARAM>(GetDlgItem(dialog, IDCANCEL)));
+    } else {
+        seen_.forced = true;
+        EndDialog(dialog, -2);
+    }
+}
+
+void ScriptedUser::look(HWND dialog) {
+    dialog_ = dialog;
+    seen_.appeared = true;
+    seen_.caption = windowText(dialog);
+    seen_.className = className(dialog);
+    if (HWND list = GetDlgItem(dialog, listId_)) {
+        seen_.items = listItems(list);
+        seen_.initialSelection = static_cast<int>(SendMessageW(list, LB_GETCURSEL, 0, 0));
+    }
+    HWND focus = GetFocus();
+    seen_.initialFocus = focus && GetParent(focus) == dialog ? GetDlgCtrlID(focus) : 0;
+}
+
+void ScriptedUser::perform(HWND dialog, const UserStep& step) {
+    switch (step.action) {
+        case UserStep::Action::Select: clickItem(dialog, listId_, step.index, false); break;
+        case UserStep::Action::DoubleClick: clickItem(dialog, listId_, step.index, true); break;
+        case UserStep::Action::Ok: clickButton(dialog, IDOK); break;
+        case UserStep::Action::Cancel: clickButton(dialog, IDCANCEL); break;
+        case UserStep::Action::Enter: pressKey(dialog, VK_RETURN, 0x1C); break;
+        case UserStep::Action::Escape: pressKey(dialog, VK_ESCAPE, 0x01); break;
+        case UserStep::Action::CloseBox: PostMessageW(dialog, WM_SYSCOMMAND, SC_CLOSE, 0); break;
+        case UserStep::Action::Wait: idleTicks_ = step.index / static_cast<int>(TickPeriod); break;
+    }
+}
+
+}  // namespace hv

@@ -1,0 +1,244 @@
+// The layer's dialogs over the module's dialog 101: the template reader, DialogBoxParamW's
+// failures, the messages a procedure gets, list-box and button semantics, the dialog
+// manager's keys and close box, and a modal loop left with nothing to deliver.
+#include <functional>
+#include <unistd.h>
+
+#include "dialog_template.h"
+#include "resources.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+const int ListId = 1001;
+
+std::u16string modulePath() {
+    char exe[4096];
+    ssize_t length = readlink("/proc/self/exe", exe, sizeof exe);
+    std::string path(exe, length > 0 ? static_cast<size_t>(length) : 0);
+    path = path.substr(0, path.rfind('/') + 1) + "Hivelet.hzx";
+    return std::u16string(path.begin(), path.end());
+}
+
+struct Command {
+    int id, code;
+    LPARAM from;
+};
+
+// What the test procedure does and saw; one dialog at a time.
+struct Script {
+    std::function<void(HWND)> onInit = [](HWND) {};
+    INT_PTR initResult = TRUE;
+    bool endOnOkOrCancel = true;
+    WPARAM initWParam = 0;
+    LPARAM initLParam = 0;
+    std::vector<Command> commands;
+    HWND dialog = nullptr;
+} script;
+
+INT_PTR CALLBACK testProc(HWND dialog, UINT message, WPARAM wParam, LPARAM lParam) {
+    if (message == WM_INITDIALOG) {
+        script.dialog = dialog;
+        script.initWParam = wParam;
+        script.initLParam = lParam;
+        script.onInit(dialog);
+        return script.initResult;
+    }
+    if (message != WM_COMMAND) return FALSE;
+    script.commands.push_back({LOWORD(wParam), HIWORD(wParam), lParam});
+    if (script.endOnOkOrCancel && (LOWORD(wParam) == IDOK || LOWORD(wParam) == IDCANCEL))
+        EndDialog(dialog, 100 + LOWORD(wParam));
+    return TRUE;
+}
+
+class Dialogs : public testing::Test {
+protected:
+    static void SetUpTestSuite() { module = LoadLibraryW(modulePath().c_str()); }
+    static void TearDownTestSuite() { FreeLibrary(module); }
+    void SetUp() override {
+        ASSERT_NE(module, nullptr);
+        w32test::reset();
+        script = Script{};
+    }
+    void TearDown() override { EXPECT_TRUE(w32test::liveWindows().empty()); }
+    static INT_PTR run(WORD id = 101, HWND owner = nullptr) {
+        return DialogBoxParamW(module, MAKEINTRESOURCEW(id), owner, testProc, 0x5EED);
+    }
+    static HMODULE module;
+};
+HMODULE Dialogs::module = nullptr;
+
+TEST_F(Dialogs, TemplateReaderAndItsBounds) {
+    const BYTE* data = nullptr;
+    size_t size = 0;
+    ASSERT_TRUE(w32::findResource(module, w32::resourceTypeDialog, 101, 0x409, &data, &size));
+    w32::DialogTemplate t;
+    ASSERT_EQ(w32::readDialogTemplate(data, size, &t), w32::TemplateStatus::ok);
+    EXPECT_EQ(t.style, 0x80C800C0u);
+    EXPECT_EQ(t.title, u"Select a root key");
+    EXPECT_EQ(t.fontName, u"Tahoma");
+    EXPECT_EQ(t.pointSize, 8);
+    ASSERT_EQ(t.items.size(), 3u);
+    EXPECT_EQ(t.items[2].id, ListId);
+    EXPECT_EQ(t.items[2].windowClass.ordinal, 0x83);
+    EXPECT_EQ(t.items[0].title.text, u"OK");
+    // Every cut of the template is refused without reading past it.
+    for (size_t cut = 0; cut + 3 < size; ++cut) {
+        std::vector<BYTE> prefix(data, data + cut);
+        EXPECT_EQ(w32::readDialogTemplate(prefix.data(), prefix.size(), &t),
+                  w32::TemplateStatus::truncated) << cut;
+    }
+    const BYTE extended[] = {1, 0, 0xFF, 0xFF, 0, 0, 0, 0};
+    EXPECT_EQ(w32::readDialogTemplate(extended, sizeof extended, &t),
+              w32::TemplateStatus::extended);
+}
+
+TEST_F(Dialogs, FailuresReturnMinusOneAndCreateNothing) {
+    int dummy = 0;
+    const struct {
+        std::function<INT_PTR()> call;
+        DWORD error;
+    } cases[] = {
+        {[] { return run(999); }, ERROR_RESOURCE_NAME_NOT_FOUND},
+        {[] { return DialogBoxParamW(module, u"ROOT", nullptr, testProc, 0); },
+         ERROR_RESOURCE_NAME_NOT_FOUND},
+        {[] { return DialogBoxParamW(nullptr, MAKEINTRESOURCEW(101), nullptr, testProc, 0); },
+         ERROR_RESOURCE_DATA_NOT_FOUND},
+        {[&] { return run(101, reinterpret_cast<HWND>(&dummy)); }, ERROR_INVALID_WINDOW_HANDLE},
+        {[] { w32test::failCall("DialogBoxParamW", 1, 8); return run(); }, 8},
+    };
+    for (size_t i = 0; i < std::size(cases); ++i) {
+        SCOPED_TRACE(i);
+        SetLastError(0);
+        EXPECT_EQ(cases[i].call(), -1);
+        EXPECT_EQ(GetLastError(), cases[i].error);
+        EXPECT_EQ(script.dialog, nullptr);
+    }
+}
+
+TEST_F(Dialogs, InitialisationUserSlotAndWindows) {
+    HWND ok = nullptr;
+    script.onInit = [&](HWND dialog) {
+        ok = GetDlgItem(dialog, IDOK);
+        EXPECT_EQ(SetWindowLongPtrW(dialog, DWLP_USER, 0x1234), 0);
+        EXPECT_EQ(GetWindowLongPtrW(dialog, DWLP_USER), 0x1234);
+        WCHAR text[32];
+        EXPECT_EQ(GetClassNameW(dialog, text, 32), 6);
+        EXPECT_EQ(std::u16string(text), u"#32770");
+        EXPECT_EQ(GetWindowTextW(dialog, text, 7), 6);
+        EXPECT_EQ(std::u16string(text), u"Select");
+        EXPECT_EQ(GetActiveWindow(), dialog);
+        EXPECT_EQ(GetDlgCtrlID(GetDlgItem(dialog, ListId)), ListId);
+        EXPECT_EQ(GetDlgItem(dialog, 77), nullptr);
+        EXPECT_EQ(w32test::liveWindows().size(), 4u);
+        PostMessageW(dialog, WM_COMMAND, IDCANCEL, 0);
+    };
+    EXPECT_EQ(run(), 100 + IDCANCEL);
+    EXPECT_EQ(script.initLParam, 0x5EED);
+    EXPECT_EQ(reinterpret_cast<HWND>(script.initWParam), ok);  // the first tab stop
+    EXPECT_FALSE(IsWindow(script.dialog));
+    EXPECT_EQ(GetActiveWindow(), nullptr);
+}
+
+TEST_F(Dialogs, ListBoxFollowsWindowsSemantics) {
+    script.onInit = [](HWND dialog) {
+        HWND list = GetDlgItem(dialog, ListId);
+        auto send = [&](UINT m, WPARAM w, LPARAM l = 0) { return SendMessageW(list, m, w, l); };
+        EXPECT_EQ(send(LB_GETCURSEL, 0), LB_ERR);
+        for (const char16_t* name : {u"b", u"a", u"c"})
+            send(LB_ADDSTRING, 0, reinterpret_cast<LPARAM>(name));
+        EXPECT_EQ(send(LB_GETCOUNT, 0), 3);
+        WCHAR text[8];
+        EXPECT_EQ(send(LB_GETTEXT, 1, reinterpret_cast<LPARAM>(text)), 1);
+        EXPECT_EQ(std::u16string(text), u"a");  // no LBS_SORT: order of adding
+        EXPECT_EQ(send(LB_GETTEXTLEN, 3), LB_ERR);
+        const std::pair<WPARAM, LRESULT> selections[] = {
+            {2, 2}, {static_cast<WPARAM>(-1), LB_ERR}, {1, 1}, {3, LB_ERR}, {0, 0}, {99, LB_ERR}};
+        for (auto [index, result] : selections) {
+            EXPECT_EQ(send(LB_SETCURSEL, index), result) << index;
+            EXPECT_EQ(send(LB_GETCURSEL, 0), result) << index;
+        }
+        EndDialog(dialog, 7);
+    };
+    EXPECT_EQ(run(), 7);
+}
+
+// Each case: what happens after initialisation, and the commands the procedure then gets.
+TEST_F(Dialogs, ButtonsKeysAndCloseBox) {
+    const struct {
+        const char* name;
+        std::function<void(HWND)> act;
+        int id;
+        INT_PTR initResult = TRUE;  // FALSE keeps a focus set during initialisation
+    } cases[] = {
+        {"BM_CLICK", [](HWND d) { SendMessageW(GetDlgItem(d, IDCANCEL), BM_CLICK, 0, 0); }, IDCANCEL},
+        {"Enter on OK", [](HWND d) { PostMessageW(GetDlgItem(d, IDOK), WM_KEYDOWN, VK_RETURN, 0); }, IDOK},
+        {"Enter on Cancel", [](HWND d) {
+             SetFocus(GetDlgItem(d, IDCANCEL));
+             PostMessageW(GetFocus(), WM_KEYDOWN, VK_RETURN, 0);
+         }, IDCANCEL, FALSE},
+        {"Enter on the list", [](HWND d) {
+             SetFocus(GetDlgItem(d, ListId));
+             PostMessageW(GetFocus(), WM_KEYDOWN, VK_RETURN, 0);
+         }, IDOK, FALSE},
+        // The focus reaches OK only after initialisation; the keys go to the dialog itself.
+        {"Tab then Enter", [](HWND d) {
+             PostMessageW(d, WM_KEYDOWN, VK_TAB, 0);
+             PostMessageW(d, WM_KEYDOWN, VK_RETURN, 0);
+         }, IDCANCEL},
+        {"Escape", [](HWND d) { PostMessageW(GetDlgItem(d, ListId), WM_KEYDOWN, VK_ESCAPE, 0); }, IDCANCEL},
+        {"close box", [](HWND d) { PostMessageW(d, WM_SYSCOMMAND, SC_CLOSE, 0); }, IDCANCEL},
+        {"WM_CLOSE", [](HWND d) { SendMessageW(d, WM_CLOSE, 0, 0); }, IDCANCEL},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.name);
+        script = Script{};
+        script.onInit = c.act;
+        script.initResult = c.initResult;
+        EXPECT_EQ(run(), 100 + c.id);
+        ASSERT_EQ(script.commands.size(), 1u);
+        EXPECT_EQ(script.commands[0].id, c.id);
+        EXPECT_EQ(script.commands[0].code, BN_CLICKED);
+    }
+}
+
+HWND focusSeen = nullptr;
+HWND okSeen = nullptr;
+
+// A timer tick, after initialisation: notes the focus and leaves.
+void CALLBACK noteFocusAndCancel(HWND, UINT, UINT_PTR id, DWORD) {
+    KillTimer(nullptr, id);
+    focusSeen = GetFocus();
+    okSeen = GetDlgItem(script.dialog, IDOK);
+    SendMessageW(script.dialog, WM_COMMAND, IDCANCEL, 0);
+}
+
+TEST_F(Dialogs, FocusGoesToTheFirstTabStopOnlyWhenInitReturnsTrue) {
+    for (INT_PTR initResult : {TRUE, FALSE}) {
+        script = Script{};
+        script.initResult = initResult;
+        script.onInit = [](HWND) { SetTimer(nullptr, 0, 50, noteFocusAndCancel); };
+        EXPECT_EQ(run(), 100 + IDCANCEL);
+        EXPECT_EQ(focusSeen, initResult ? okSeen : nullptr);
+        EXPECT_EQ(w32test::pendingTimers(), 0u);
+    }
+}
+
+void CALLBACK doNothing(HWND, UINT, UINT_PTR, DWORD) {}
+
+TEST_F(Dialogs, LoopWithNothingToDeliverEndsTheDialog) {
+    script.endOnOkOrCancel = false;
+    SetLastError(0);
+    EXPECT_EQ(run(), -1);
+    EXPECT_EQ(GetLastError(), static_cast<DWORD>(ERROR_TIMEOUT));
+    EXPECT_EQ(w32test::count("ModalLoopStalled"), 1u);
+    // A timer that never ends the dialog counts as nothing to deliver, too.
+    script = Script{};
+    script.endOnOkOrCancel = false;
+    script.onInit = [](HWND) { SetTimer(nullptr, 0, 10, doNothing); };
+    EXPECT_EQ(run(), -1);
+    EXPECT_EQ(w32test::count("ModalLoopStalled"), 2u);
+}
+
+}  // namespace
