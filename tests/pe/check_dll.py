@@ -422,6 +422,9 @@ def check_exports(report, pe):
     extra = sorted(set(exported) - set(declared))
     report.check('exported names equal the names in Hivelet.def (%d)' % len(declared),
                  not missing and not extra, 'missing %s, not declared %s' % (missing, extra))
+    absent = sorted(set(EXPORT_ORDINALS) - set(exported))
+    report.check('every entry point the host looks up is exported', not absent,
+                 'missing %s' % ', '.join(absent))
 
 
 # Static linking must leave nothing but system libraries to load.
@@ -433,6 +436,15 @@ def check_imports(report, pe):
                and not name.lower().startswith('api-ms-win-crt-')]
     report.check('imports only system libraries (%s)' % ', '.join(libraries), not foreign,
                  'also imports %s' % ', '.join(foreign))
+    # The 32-bit contract of the root-key dialog: its user-data slot through the LONG forms.
+    user32 = {symbol.name.decode('ascii', 'replace')
+              for entry in getattr(pe, 'DIRECTORY_ENTRY_IMPORT', [])
+              if entry.dll.decode('ascii', 'replace').lower() == 'user32.dll'
+              for symbol in entry.imports if symbol.name}
+    wanted = {'SetWindowLongW', 'GetWindowLongW', 'DialogBoxParamW', 'EndDialog', 'LoadMenuW',
+              'wsprintfW'}
+    report.check('user32 imports include %s' % ', '.join(sorted(wanted)), wanted <= user32,
+                 'missing %s' % ', '.join(sorted(wanted - user32)))
 
 
 # No resource missing, none extra, all U.S. English.
