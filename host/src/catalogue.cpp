@@ -1,5 +1,6 @@
 // The editor's side of the event catalogue: menus, entries, texts and filled-in sentences.
 #include <hivelet/catalogue.h>
+#include <hivelet/param_editor.h>
 
 #include <stdexcept>
 
@@ -16,7 +17,6 @@ typedef const int16_t*(WINAPI* InfosFn)(void*, Slot);
 typedef void(WINAPI* StringFn)(void*, Slot, LPWSTR, Slot);
 typedef void(WINAPI* TitleFn)(void*, Slot, Slot, LPWSTR, Slot);
 typedef void(WINAPI* ExpressionTitleFn)(void*, Slot, LPWSTR, Slot);
-typedef void(WINAPI* ParameterStringFn)(void*, Slot, void*, LPWSTR, Slot);
 typedef void(WINAPI* ObjInfosFn)(Slot, Slot, LPWSTR, LPWSTR, LPWSTR, LPWSTR, LPWSTR);
 
 // Export names by kind: condition, action, expression.
@@ -153,8 +153,8 @@ std::u16string Catalogue::displayText(EventKind kind, int code, int capacity) {
 
 std::u16string Catalogue::title(EventKind kind, int code, int index, int capacity) {
     if (kind == EventKind::Expression) {
-        TextBuffer buffer("GetExpressionTitle", capacity);
         if (index != 0) return std::u16string();
+        TextBuffer buffer("GetExpressionTitle", capacity);
         module_.entry<ExpressionTitleFn>("GetExpressionTitle")(editor_.structure(), code,
                                                                buffer.data(), capacity);
         return buffer.text();
@@ -177,12 +177,12 @@ std::u16string Catalogue::parameterText(const Param& param) {
         case Param::Kind::Text: return u"\"" + param.text + u"\"";
         case Param::Kind::Integer: return fromUtf8(std::to_string(param.integer));
         case Param::Kind::RootKey: {
-            auto fn = reinterpret_cast<ParameterStringFn>(
-                reinterpret_cast<void*>(module_.address("GetParameterString")));
-            std::vector<uint8_t> record = rootKeyRecord(param.rootIndex);
-            TextBuffer buffer("GetParameterString", 64);
-            if (fn) fn(editor_.structure(), 0, record.data(), buffer.data(), 64);
-            return buffer.text();
+            ParamEditor editor(module_, editor_);
+            editor.setRecord(param.rootIndex);
+            ParamEditor::Text name = editor.string(64);
+            if (!name.intact) throw std::runtime_error("GetParameterString wrote past its buffer");
+            // An index past the table leaves the buffer alone: there is no name to show.
+            return name.untouched ? std::u16string() : name.text;
         }
         case Param::Kind::Null: return u"(null)";
         default: return u"?";

@@ -30,6 +30,8 @@ struct IntegerDigits {
 std::string scanInteger(const std::string& word, IntegerDigits& number);
 // Reads a 32-bit integer written in decimal (possibly negative) or 0x hex; returns an error or "".
 std::string parseInteger(const std::string& word, int64_t& value);
+// An integer value, as a command's operand.
+Value integerValue(int64_t n);
 // Reads an event parameter; returns an error or "".
 std::string parseParameter(const Token& token, Value& value);
 // Bytes as "[61 00 ff]".

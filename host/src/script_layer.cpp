@@ -41,13 +41,6 @@ bool isName(const std::string& word) {
     return true;
 }
 
-Value integerValue(int64_t n) {
-    Value v;
-    v.kind = Value::Kind::Integer;
-    v.integer = n;
-    return v;
-}
-
 Value wordValue(const std::string& word) {
     Value v;
     v.kind = Value::Kind::Word;

@@ -135,6 +135,13 @@ std::string parseInteger(const std::string& word, int64_t& value) {
     return std::string();
 }
 
+Value integerValue(int64_t n) {
+    Value v;
+    v.kind = Value::Kind::Integer;
+    v.integer = n;
+    return v;
+}
+
 std::string parseParameter(const Token& token, Value& value) {
     const std::string& w = token.word;
     if (token.quoted) {

@@ -32,13 +32,6 @@ Value word(const std::string& w) {
     return v;
 }
 
-Value number(int64_t n) {
-    Value v;
-    v.kind = Value::Kind::Integer;
-    v.integer = n;
-    return v;
-}
-
 std::string integerOperand(const Token& t, Value& out) {
     out.kind = Value::Kind::Integer;
     if (t.quoted) return "expected an integer, not " + quote(t.text);
@@ -115,7 +108,7 @@ std::string parseExpectLine(const std::vector<Token>& ops, Step& step) {
     if (what == "selection") {
         if (rest.size() != 1) return ExpectUsage;
         if (!rest[0].quoted && rest[0].word == "none") {
-            step.values.push_back(number(LB_ERR));
+            step.values.push_back(integerValue(LB_ERR));
             return std::string();
         }
         Value n;

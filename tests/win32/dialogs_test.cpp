@@ -2,9 +2,9 @@
 // failures, the messages a procedure gets, list-box and button semantics, the dialog
 // manager's keys and close box, and a modal loop left with nothing to deliver.
 #include <functional>
-#include <unistd.h>
 
 #include "dialog_template.h"
+#include "module_path.h"
 #include "resources.h"
 
 #include <gtest/gtest.h>
@@ -12,14 +12,6 @@
 namespace {
 
 const int ListId = 1001;
-
-std::u16string modulePath() {
-    char exe[4096];
-    ssize_t length = readlink("/proc/self/exe", exe, sizeof exe);
-    std::string path(exe, length > 0 ? static_cast<size_t>(length) : 0);
-    path = path.substr(0, path.rfind('/') + 1) + "Hivelet.hzx";
-    return std::u16string(path.begin(), path.end());
-}
 
 struct Command {
     int id, code;

@@ -1,23 +1,14 @@
 // LoadStringW and resource lookup over the module's own compiled resources.
+#include "module_path.h"
 #include "pattern_buffer.h"
 #include "resources.h"
 
-#include <unistd.h>
 
 namespace {
 
 constexpr DWORD unchanged = 0xBEEF;
 const char16_t description[] =
     u"The Hivelet object allows you to retrieve or write values from or to the registry.";
-
-// The module file, which the build puts beside this program.
-std::u16string modulePath() {
-    char exe[4096];
-    ssize_t length = readlink("/proc/self/exe", exe, sizeof exe);
-    std::string path(exe, length > 0 ? static_cast<size_t>(length) : 0);
-    path = path.substr(0, path.rfind('/') + 1) + "Hivelet.hzx";
-    return std::u16string(path.begin(), path.end());  // build paths are ASCII
-}
 
 class ModuleResources : public testing::Test {
 protected:
