@@ -47,15 +47,15 @@ if(NOT HV_PYTHON)
   find_program(HV_PYTHON NAMES python3 REQUIRED)
 endif()
 
-# Which builds can run their own programs here: the i686 DLL is checked statically only.
-set(HV_CAN_RUN ON)
-if(WIN32 AND CMAKE_SIZEOF_VOID_P EQUAL 4)
-  set(HV_CAN_RUN OFF)
-endif()
-
-# Windows programs of the 64-bit build run under Wine, headless, one prefix per build tree.
-if(WIN32 AND HV_CAN_RUN)
+# Windows programs run under Wine, headless, one prefix per build tree: the i686 build under
+# 32-bit Wine (`wine`, a 32-bit process as the host's), the x86-64 build under `wine64`.
+if(WIN32)
   set(HV_WINE_PREFIX ${CMAKE_BINARY_DIR}/wine-prefix)
+  if(CMAKE_SIZEOF_VOID_P EQUAL 4)
+    set(HV_WINE wine)
+  else()
+    set(HV_WINE wine64)
+  endif()
   configure_file(${CMAKE_SOURCE_DIR}/tools/wine-run.in ${CMAKE_BINARY_DIR}/wine-run @ONLY
                  FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE
                                   WORLD_READ WORLD_EXECUTE)
