@@ -73,8 +73,8 @@ public:
     bool fail(const Step& step, const std::string& message);
     // Prints a transcript line for `step`.
     void show(const Step& step, const std::string& detail);
-    // Shows a layer line that this build cannot run, with the reason.
-    void skip(const Step& step);
+    // Shows a line that this build cannot run, with the reason.
+    void skip(const Step& step, const std::string& why);
     void remember(EventKind kind, Outcome outcome);
     const Outcome* last() const { return last_ ? &*last_ : nullptr; }
     EventKind lastKind() const { return lastKind_; }

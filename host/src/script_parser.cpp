@@ -26,7 +26,7 @@ std::string wordAt(const std::string& line, size_t pos, size_t* stop) {
 
 // Parses the line from `pos` into `step`; returns an error, or "" (with an empty command for a
 // line that holds nothing to do). A `layer` before an ordinary command marks that line as one
-// for the portable layer only.
+// for the portable layer only, a `process32` as one for a 32-bit process's registry view.
 std::string parseLine(const std::string& line, size_t pos, Step& step) {
     size_t start = line.find_first_not_of(" \t", pos);
     if (start == std::string::npos || line[start] == '#') return std::string();
@@ -42,12 +42,23 @@ std::string parseLine(const std::string& line, size_t pos, Step& step) {
             return parseLine(line, stop, step);
         }
     }
-    if (step.command == "}") {
+    if (step.command == "process32") {
+        size_t afterGuard = 0;
+        std::string next = wordAt(line, stop, &afterGuard);
+        if (next == "process32") return "process32 is written once";
+        if (next != "{") {
+            step.process32Only = true;
+            return parseLine(line, stop, step);
+        }
+        step.subject = "{";
+        stop = afterGuard;
+    }
+    if (step.command == "}" || step.subject == "{") {
         std::vector<Token> rest;
         size_t end = 0;
         std::string error = lex(line, stop, rest, &end);
-        step.source = "}";
-        if (error.empty() && !rest.empty()) error = "stray text after }";
+        step.source = step.command == "}" ? "}" : step.command + " {";
+        if (error.empty() && !rest.empty()) error = "stray text after " + step.source;
         return error;
     }
     const Command* command = findCommand(step.command);
@@ -69,18 +80,25 @@ std::string parseLine(const std::string& line, size_t pos, Step& step) {
     return command->parse(tokens, step);
 }
 
-// Keeps track of `layer {` ... `}`: the lines between them run only with the portable layer.
-// Returns an error, or "" with `keep` false for the block's own lines.
-std::string trackBlock(Step& step, int& blockLine, bool& keep) {
-    bool opens = step.command == "layer" && step.subject == "{";
+// An open `layer {` or `process32 {` block: where it began and which guard it puts on its lines.
+struct Block {
+    int line = 0;
+    std::string guard;
+};
+
+// Keeps track of `layer {` ... `}` and `process32 {` ... `}`: the lines between them carry the
+// block's guard. Returns an error, or "" with `keep` false for the block's own lines.
+std::string trackBlock(Step& step, Block& block, bool& keep) {
+    bool opens = step.subject == "{" && (step.command == "layer" || step.command == "process32");
     keep = !opens && step.command != "}";
-    if (opens && blockLine)
-        return "layer blocks do not nest (one is open since line " + std::to_string(blockLine) +
-               ")";
-    if (opens) blockLine = step.line;
-    if (step.command == "}" && !blockLine) return "} without layer {";
-    if (step.command == "}") blockLine = 0;
-    if (keep && blockLine) step.layerOnly = true;
+    if (opens && block.line)
+        return "blocks do not nest (" + block.guard + " { is open since line " +
+               std::to_string(block.line) + ")";
+    if (opens) block = Block{step.line, step.command};
+    if (step.command == "}" && !block.line) return "} without layer { or process32 {";
+    if (step.command == "}") block = Block();
+    if (keep && block.guard == "layer") step.layerOnly = true;
+    if (keep && block.guard == "process32") step.process32Only = true;
     return std::string();
 }
 
@@ -91,7 +109,7 @@ ParseResult parse(const std::string& file, const std::string& text) {
     result.script.file = file;
     std::istringstream lines(text);
     std::string line;
-    int blockLine = 0;  // where the open layer block began
+    Block block;
     for (int number = 1; std::getline(lines, line); ++number) {
         if (number == 1 && line.compare(0, 3, "\xEF\xBB\xBF") == 0) line.erase(0, 3);
         if (!line.empty() && line.back() == '\r') line.pop_back();
@@ -99,15 +117,16 @@ ParseResult parse(const std::string& file, const std::string& text) {
         step.line = number;
         std::string error = parseLine(line, 0, step);
         bool keep = false;
-        if (error.empty() && !step.command.empty()) error = trackBlock(step, blockLine, keep);
+        if (error.empty() && !step.command.empty()) error = trackBlock(step, block, keep);
         if (!error.empty()) {
             result.error = file + ":" + std::to_string(number) + ": " + error;
             return result;
         }
         if (keep) result.script.steps.push_back(std::move(step));
     }
-    if (blockLine)
-        result.error = file + ":" + std::to_string(blockLine) + ": layer { is not closed";
+    if (block.line)
+        result.error = file + ":" + std::to_string(block.line) + ": " + block.guard +
+                       " { is not closed";
     return result;
 }
 

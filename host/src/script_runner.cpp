@@ -34,9 +34,9 @@ void Session::show(const Step& step, const std::string& detail) {
     out << "   " << detail << '\n';
 }
 
-void Session::skip(const Step& step) {
+void Session::skip(const Step& step, const std::string& why) {
     ++skipped;
-    show(step, "skipped under Windows: " + layerSkipNote(step));
+    show(step, "skipped " + why);
 }
 
 void Session::remember(EventKind kind, Outcome outcome) {
@@ -49,6 +49,9 @@ const bool LayerBuilt = false;
 #else
 const bool LayerBuilt = true;
 #endif
+// The registry's default view is a 32-bit process's: the portable layer's model, which plays
+// the process the module ships for, and 32-bit Windows.
+const bool DefaultView32 = LayerBuilt || sizeof(void*) == 4;
 
 Runner::Runner(Module& module, std::ostream& out, std::ostream& err)
     : module_(module), out_(out), err_(err), layer_(LayerBuilt) {}
@@ -70,8 +73,12 @@ bool Runner::run(const Script& script) {
         return false;
     }
     for (const Step& step : script.steps) {
+        if (step.process32Only && !DefaultView32) {
+            session->skip(step, "in a 64-bit process: its default registry view is the 64-bit one");
+            continue;
+        }
         if (step.layerOnly && !layer_) {
-            session->skip(step);
+            session->skip(step, "under Windows: " + layerSkipNote(step));
             continue;
         }
         bool passed = false;
@@ -89,7 +96,7 @@ bool Runner::run(const Script& script) {
     undoLayer(*session);
     out_ << "== " << script.file << ": passed (" << session->events << " events, "
          << session->expectations << " expectations";
-    if (session->skipped) out_ << ", " << session->skipped << " layer lines skipped";
+    if (session->skipped) out_ << ", " << session->skipped << " lines skipped";
     out_ << ")\n\n";
     return true;
 }

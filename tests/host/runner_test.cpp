@@ -245,9 +245,33 @@ TEST(ScriptRunner, LayerLinesAreSkippedWithANote) {
         "  10    expect error 7   skipped under Windows: holds only with the portable layer",
         "reg expect key missing HKEY_CURRENT_USER \"Software\"   skipped under Windows: holds only "
         "with the portable layer",
-        "passed (1 events, 1 expectations, 10 layer lines skipped)",
+        "passed (1 events, 1 expectations, 10 lines skipped)",
     };
     for (const char* line : lines) EXPECT_TRUE(contains(r.out, line)) << line << "\n" << r.out;
+}
+
+// process32 lines hold where the registry's default view is a 32-bit process's: with the
+// portable layer and in 32-bit Windows; a 64-bit Windows process skips them with the reason.
+TEST(ScriptRunner, Process32LinesRunOnlyWhereTheDefaultViewIs32Bit) {
+    Ran r = run(
+        "reg key delete HKEY_LOCAL_MACHINE \"SOFTWARE\\\\HiveletRunnerTest\" view32\n"
+        "reg key create HKEY_LOCAL_MACHINE \"SOFTWARE\\\\HiveletRunnerTest\" view32\n"
+        "process32 {\n"
+        "  cnd CndKeyExists HKEY_LOCAL_MACHINE \"SOFTWARE\\\\HiveletRunnerTest\"\n"
+        "  expect true\n"
+        "}\n"
+        "reg key delete HKEY_LOCAL_MACHINE \"SOFTWARE\\\\HiveletRunnerTest\" view32\n");
+    EXPECT_TRUE(r.passed) << r.err;
+#ifdef _WIN32
+    const bool skipped = sizeof(void*) == 8;
+#else
+    const bool skipped = false;
+#endif
+    EXPECT_EQ(contains(r.out, "expect true   skipped in a 64-bit process: its default registry "
+                              "view is the 64-bit one"),
+              skipped)
+        << r.out;
+    EXPECT_EQ(contains(r.out, "2 lines skipped"), skipped) << r.out;
 }
 
 // Against the layer: rights denied, calls failed, the journal read; and whatever a script

@@ -243,13 +243,38 @@ TEST(ScriptParser, LayerLinesAndBlocks) {
     EXPECT_EQ(s[12].line, 14);
 }
 
+// `process32` marks its line or its block's lines; a layer line may stand inside the block.
+TEST(ScriptParser, Process32LinesAndBlocks) {
+    std::vector<Step> s = steps(
+        "process32 cnd CndKeyExists HKEY_LOCAL_MACHINE \"SOFTWARE\"\n"
+        "process32 {\n"
+        "  expect true\n"
+        "  layer expect calls RegOpenKeyExW mask 0x20019\n"
+        "}\n"
+        "expect true\n");
+    ASSERT_EQ(s.size(), 4u);
+    const bool process32[] = {true, true, true, false};
+    const bool layer[] = {false, false, true, false};
+    for (size_t i = 0; i < s.size(); ++i) {
+        EXPECT_EQ(s[i].process32Only, process32[i]) << "step " << i;
+        EXPECT_EQ(s[i].layerOnly, layer[i]) << "step " << i;
+    }
+    EXPECT_EQ(s[0].source, "process32 cnd CndKeyExists HKEY_LOCAL_MACHINE \"SOFTWARE\"");
+    EXPECT_EQ(s[0].routine, "CndKeyExists");
+}
+
 // A block left open is reported at its own line; a closing brace needs an open block.
 TEST(ScriptParser, LayerBlockErrors) {
     const std::pair<const char*, const char*> table[] = {
         {"act ActSet64BitMode 1\nlayer {\nnew\n", "t.hvs:2: layer { is not closed"},
-        {"layer {\nlayer {\n}\n", "t.hvs:2: layer blocks do not nest (one is open since line 1)"},
-        {"new\n}\n", "t.hvs:2: } without layer {"},
-        {"layer {\n}\n}\n", "t.hvs:3: } without layer {"},
+        {"layer {\nlayer {\n}\n", "t.hvs:2: blocks do not nest (layer { is open since line 1)"},
+        {"process32 {\nlayer {\n}\n",
+         "t.hvs:2: blocks do not nest (process32 { is open since line 1)"},
+        {"process32 {\nnew\n", "t.hvs:1: process32 { is not closed"},
+        {"process32 { new\n}\n", "t.hvs:1: stray text after process32 {"},
+        {"process32 process32 new\n", "t.hvs:1: process32 is written once"},
+        {"new\n}\n", "t.hvs:2: } without layer { or process32 {"},
+        {"layer {\n}\n}\n", "t.hvs:3: } without layer { or process32 {"},
         {"layer {\n} new\n", "t.hvs:2: stray text after }"},
     };
     for (auto [script, message] : table) {
@@ -408,7 +433,7 @@ const Malformed MalformedLines[] = {
     {"layer expect nothing", "expect takes a text, an integer, true, false or one of: error, "
                                "message, fetches, buffers, address, rootKeyIndex, currentKey, "
                                "use64BitView, debug, file; not 'nothing'"},
-    {"}", "} without layer {"},
+    {"}", "} without layer { or process32 {"},
 };
 
 // Keeps the quotes and backslashes of a row out of the generated test names.

@@ -1,5 +1,5 @@
-// The masks, roots and view of the routines proven by their effect: keys that refuse one right,
-// the two copies of HKLM\SOFTWARE, and each root by index and by name.
+// The masks and roots of the routines proven by their effect: keys that refuse one right, and
+// each root by index and by name. The view flag has its own tests (registry_views_test.cpp).
 #include "registry_fixture.h"
 
 namespace hvreg {
@@ -48,43 +48,6 @@ INSTANTIATE_TEST_SUITE_P(
                       Denial{KEY_ENUMERATE_SUB_KEYS, 0, 5, 5, 5, 5},
                       Denial{KEY_NOTIFY, 0, 5, 5, 5, 0}, Denial{KEY_CREATE_LINK, 1, 0, 5, 5, 0},
                       Denial{READ_CONTROL, 0, 5, 5, 5, 0}, Denial{DELETE, 1, 0, 5, 5, 5}));
-
-using RegistryViewFlag = RegistryFixture;
-
-// The 32-bit process's default view of HKLM\SOFTWARE is its own copy; the flag reaches the
-// 64-bit one (Wine runs the tests as a 64-bit process, whose default is the 64-bit view).
-TEST_F(RegistryViewFlag, EachRoutineReachesOnlyTheCopyOfItsView) {
-    HV_NEEDS_TEST_CONTROL();
-    const HKEY machine = HKEY_LOCAL_MACHINE;
-    const std::u16string path = u"SOFTWARE\\HiveletView";
-    const Param root = Param::rootKey(1), key = Param::str(path), v = Param::str(u"v");
-    view64(true);
-    act(SetDword, {root, key, v, Param::integerValue(64)});
-    EXPECT_EQ(stored(machine, path, u"v", KEY_WOW64_64KEY), "4: 40 00 00 00");
-    EXPECT_FALSE(exists(machine, path));
-    for (bool on : {true, false}) {
-        SCOPED_TRACE(on);
-        view64(on);
-        EXPECT_EQ(cond(KeyExists, {root, key}).asCondition(), on);
-        EXPECT_EQ(cond(ValueExists, {root, key, v}).asCondition(), on);
-        EXPECT_EQ(expr(GetDword, {Param::str(RootNames[1]), key, v}).asInteger(), on ? 64 : 0);
-        EXPECT_EQ(instance.lastError(), on ? 0u : 2u);
-    }
-    act(SetString, {root, key, v, Param::str(u"32")});
-    view64(true);
-    act(DeleteValue, {root, key, v});
-    EXPECT_EQ(stored(machine, path, u"v", KEY_WOW64_64KEY), "error 2");
-    EXPECT_EQ(stored(machine, path, u"v"), shown(REG_SZ, u"32"));
-    act(CreateKey, {root, Param::str(path + u"\\Sub")});
-    EXPECT_TRUE(exists(machine, path + u"\\Sub", KEY_WOW64_64KEY));
-    EXPECT_FALSE(exists(machine, path + u"\\Sub"));
-    act(DeleteKey, {root, key});
-    EXPECT_FALSE(exists(machine, path, KEY_WOW64_64KEY));
-    EXPECT_TRUE(exists(machine, path));
-    view64(false);
-    act(DeleteKey, {root, key});
-    EXPECT_FALSE(exists(machine, path));
-}
 
 using RegistryRootTable = RegistryFixture;
 const HKEY RootHandles[5] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,

@@ -50,6 +50,10 @@ struct Step {
     // Runs only against the portable Win32 layer (a `layer` line, or a line in a layer block);
     // a Windows build skips it with a note.
     bool layerOnly = false;
+    // Holds only where the registry's default view is a 32-bit process's (a `process32` line, or
+    // a line in a process32 block): with the portable layer, which plays that process, and in
+    // the 32-bit Windows build; the 64-bit Windows build skips it with a note.
+    bool process32Only = false;
 };
 
 struct Script {
