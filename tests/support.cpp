@@ -15,13 +15,6 @@ hv::Module& module() {
     return *loaded;
 }
 
-std::u16string systemMessage(DWORD code) {
-    WCHAR buffer[512];
-    DWORD n = FormatMessageW(FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS, nullptr,
-                             code, 0, buffer, 512, nullptr);
-    return std::u16string(reinterpret_cast<const char16_t*>(buffer), n);
-}
-
 std::string show(const std::u16string& s) { return hv::toUtf8(s); }
 
 }  // namespace hvtest

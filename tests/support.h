@@ -63,9 +63,6 @@ inline std::u16string text(const WCHAR* p) {
 inline LPWSTR wide(char16_t* p) { return reinterpret_cast<LPWSTR>(p); }
 inline LPCWSTR wide(const char16_t* p) { return reinterpret_cast<LPCWSTR>(p); }
 
-// The system's message text for a code, as the module's message expression must give it.
-std::u16string systemMessage(DWORD code);
-
 // Gtest prints UTF-16 text readably.
 std::string show(const std::u16string& s);
 
