@@ -1,6 +1,6 @@
 // The records the host and the module share at run time: the instance record, the host's run
 // header with its services, the RunObjectInfos block and the routine shapes. Byte offsets are
-// a contract with the host; 32-bit builds assert every one of them.
+// what the host reads and writes; 32-bit builds assert every one of them.
 #pragma once
 
 #include <windows.h>

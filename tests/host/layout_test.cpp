@@ -1,5 +1,5 @@
 // The byte offsets the host simulator lays its structures out with, for 32- and 64-bit modules,
-// checked against the published contract rather than against the module's own structures.
+// written down here rather than taken from the module's own structures.
 #include <gtest/gtest.h>
 #include <hivelet/host.h>
 
@@ -14,7 +14,7 @@ struct Expected {
     size_t counts[3], u16Twenty, u32Zero, u8Hundred, hostByte, u16Zero, identifier, u16One;
 };
 
-const Expected Contract[] = {
+const Expected HostOffsets[] = {
     {4,   184, 188, 192, 196,          200, 872, 876, 880, 928, 20, 336,
      340, 0,   4,   8,   {12, 14, 16}, 18,  20,  24,  25,  26,  28, 32},
     {8,   184, 192, 200, 204,          208, 872, 880, 888, 928, 24, 336,
@@ -27,7 +27,7 @@ void PrintTo(const Expected& e, std::ostream* os) {
 
 class Layout : public testing::TestWithParam<Expected> {};
 
-TEST_P(Layout, MatchesTheContract) {
+TEST_P(Layout, MatchesTheHostsOffsets) {
     const Expected& e = GetParam();
     const hv::HostLayout l = hv::layoutFor(e.pointer);
     EXPECT_EQ(l.runHeader, 8u);
@@ -61,14 +61,14 @@ TEST_P(Layout, MatchesTheContract) {
     EXPECT_EQ(l.rootParamIndex, 6u);
 }
 
-INSTANTIATE_TEST_SUITE_P(PointerSizes, Layout, testing::ValuesIn(Contract),
+INSTANTIATE_TEST_SUITE_P(PointerSizes, Layout, testing::ValuesIn(HostOffsets),
                          [](const testing::TestParamInfo<Expected>& row) {
                              return std::to_string(row.param.pointer * 8) + "bit";
                          });
 
 // The build's own layout is the one for its pointer size, and the Instance accessors use it.
 TEST(Layout, ThisBuildUsesItsPointerSize) {
-    const Expected& mine = Contract[sizeof(void*) == 4 ? 0 : 1];
+    const Expected& mine = HostOffsets[sizeof(void*) == 4 ? 0 : 1];
     EXPECT_EQ(hv::hostLayout.pointerSize, sizeof(void*));
     EXPECT_EQ(hv::hostLayout.currentKey, mine.currentKey);
     EXPECT_EQ(hv::Instance::rootKeyIndexOffset(), mine.rootKeyIndex);

@@ -15,7 +15,7 @@ const size_t Ptr = sizeof(void*);
 // Offsets of the RunObjectInfos fields after the three table pointers.
 size_t countsAt() { return 3 * Ptr; }
 
-TEST(Lifecycle, RecordSizeIsTheContractSize) {
+TEST(Lifecycle, RecordSizeIs200BytesIn32Bits) {
     auto size = hvtest::module().entry<DataSizeFn>("GetRunObjectDataSize")(0, 0);
     EXPECT_EQ(size, Ptr == 4 ? 200 : 208);
 }

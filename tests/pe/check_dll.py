@@ -435,7 +435,7 @@ def check_imports(report, pe):
                and not name.lower().startswith('api-ms-win-crt-')]
     report.check('imports only system libraries (%s)' % ', '.join(libraries), not foreign,
                  'also imports %s' % ', '.join(foreign))
-    # The 32-bit contract of the root-key dialog: its user-data slot through the LONG forms.
+    # The root-key dialog in 32 bits: its user-data slot through the LONG forms.
     user32 = {symbol.name.decode('ascii', 'replace')
               for entry in getattr(pe, 'DIRECTORY_ENTRY_IMPORT', [])
               if entry.dll.decode('ascii', 'replace').lower() == 'user32.dll'
