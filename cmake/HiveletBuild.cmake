@@ -50,7 +50,7 @@ endif()
 # Windows programs run under Wine, headless, one prefix per build tree: the i686 build under
 # 32-bit Wine (`wine`, a 32-bit process as the host's), the x86-64 build under `wine64`.
 if(WIN32)
-  set(HV_WINE_PREFIX ${CMAKE_BINARY_DIR}/wine-prefix)
+  set(HV_WINE_PREFIX ${CMAKE_BINARY_DIR}/wine-prefix CACHE PATH "Wine prefix of this tree's programs")
   if(CMAKE_SIZEOF_VOID_P EQUAL 4)
     set(HV_WINE wine)
   else()
@@ -60,4 +60,18 @@ if(WIN32)
                  FILE_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE GROUP_READ GROUP_EXECUTE
                                   WORLD_READ WORLD_EXECUTE)
   set(CMAKE_CROSSCOMPILING_EMULATOR ${CMAKE_BINARY_DIR}/wine-run)
+endif()
+
+# A release is reproducible: two builds of one commit, in any folders, give the same bytes. Its
+# time stamps (the DLL's, the help file's, the archive entries') all come from
+# SOURCE_DATE_EPOCH, by default the date of the commit, and no build path reaches an output.
+if(HV_RELEASE)
+  if(NOT WIN32 OR NOT CMAKE_SIZEOF_VOID_P EQUAL 4 OR NOT HV_BUILD_HOST)
+    message(FATAL_ERROR "HV_RELEASE needs the i686 Windows build with the host simulator")
+  endif()
+  include(SourceDateEpoch)
+  add_compile_options(-ffile-prefix-map=${CMAKE_SOURCE_DIR}=. -ffile-prefix-map=${CMAKE_BINARY_DIR}=.)
+  # ld stamps a PE file with SOURCE_DATE_EPOCH when it is set, and with the time of day if not.
+  set_property(GLOBAL PROPERTY RULE_LAUNCH_LINK
+               "${CMAKE_COMMAND} -E env SOURCE_DATE_EPOCH=${HV_SOURCE_DATE_EPOCH}")
 endif()

@@ -24,6 +24,7 @@ packages="
   wine64 wine
   libgtest-dev googletest libbenchmark-dev
   clang libclang-rt-14-dev
+  fp-utils libchm-bin
 "
 missing=""
 for p in $packages; do

@@ -1,14 +1,15 @@
 #!/bin/sh
 # Sets up, builds and tests every build: linux (ASan+UBSan), linux-i386 (under qemu-i386),
 # windows-i686 (the shipped DLL, its static checks, and the simulator and tests under 32-bit
-# Wine), windows-x64 (under 64-bit Wine) and fuzz (a short run of every fuzz target). Ends with
-# the totals over all builds and the time each build's tests took.
+# Wine), windows-x64 (under 64-bit Wine), release (the help file and the archive, their checks,
+# and two more builds that must give the same bytes) and fuzz (a short run of every fuzz
+# target). Ends with the totals over all builds and the time each build's tests took.
 set -eu
 cd "$(dirname "$0")/.."
 tools/setup.sh
-presets=${HV_PRESETS:-"linux linux-i386 windows-i686 windows-x64 fuzz"}
+presets=${HV_PRESETS:-"linux linux-i386 windows-i686 windows-x64 release fuzz"}
 stopWine() {
-  for p in windows-i686 windows-x64; do
+  for p in windows-i686 windows-x64 release; do
     PATH=/usr/lib/wine:$PATH WINEPREFIX="$PWD/build/$p/wine-prefix" wineserver -k 2>/dev/null || true
   done
 }

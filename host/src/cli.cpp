@@ -15,6 +15,7 @@ const char Usage[] =
     "usage: hivelet-host run [--module PATH] SCRIPT...\n"
     "       hivelet-host check SCRIPT...\n"
     "       hivelet-host menus [--module PATH]\n"
+    "       hivelet-host catalogue [--module PATH]\n"
     "       hivelet-host dump-state FILE\n"
     "       hivelet-host --help\n"
     "\n"
@@ -26,6 +27,8 @@ const char Usage[] =
     "  check   only parse the scripts and report malformed lines\n"
     "  menus   print the editor's view of the events: the three menus as trees, each event\n"
     "          with its code, display text and parameter titles\n"
+    "  catalogue  print the same catalogue as JSON, with the object's identity strings and the\n"
+    "             messages of the module's own error codes, for tools\n"
     "  dump-state  print a saved-state file (version, root key, last error, key); a\n"
     "              malformed file gives a message and exit status 1\n"
     "  --module PATH   the module to load; by default $HIVELET_MODULE, or else Hivelet.hzx\n"
@@ -85,8 +88,8 @@ int runCommand(const std::vector<std::string>& args, std::ostream& out, std::ost
     return failed ? 1 : 0;
 }
 
-// `menus`: the editor's view of the module's events.
-int menusCommand(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
+// `menus` and `catalogue`: the editor's view of the module's events, for people or for tools.
+int editorCommand(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
     std::string path;
     for (size_t i = 1; i < args.size(); ++i) {
         if (args[i] == "--module" && i + 1 < args.size()) {
@@ -94,7 +97,7 @@ int menusCommand(const std::vector<std::string>& args, std::ostream& out, std::o
         } else if (args[i].compare(0, 9, "--module=") == 0) {
             path = args[i].substr(9);
         } else {
-            return usageError(err, "menus takes no argument " + args[i]);
+            return usageError(err, args[0] + " takes no argument " + args[i]);
         }
     }
     if (path.empty()) path = defaultModulePath();
@@ -107,7 +110,10 @@ int menusCommand(const std::vector<std::string>& args, std::ostream& out, std::o
     Editor editor;
     Catalogue catalogue(*module, editor);
     try {
-        printEditorView(catalogue, out);
+        if (args[0] == "menus")
+            printEditorView(catalogue, out);
+        else
+            printCatalogueJson(*module, catalogue, out);
     } catch (const std::exception& e) {
         err << "hivelet-host: " << e.what() << std::endl;
         return 1;
@@ -166,7 +172,7 @@ int commandLine(const std::vector<std::string>& args, std::ostream& out, std::os
     }
     if (command == "run") return runCommand(args, out, err);
     if (command == "check") return checkCommand(args, out, err);
-    if (command == "menus") return menusCommand(args, out, err);
+    if (command == "menus" || command == "catalogue") return editorCommand(args, out, err);
     if (command == "dump-state") return dumpStateCommand(args, out, err);
     return usageError(err, "unknown command " + command);
 }

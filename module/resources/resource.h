@@ -1,18 +1,10 @@
-/* Resource identifiers and version numbers of the Hivelet module.
+/* Resource identifiers of the Hivelet module (its version numbers are in the configured
+ * version.h, made from the project's version).
  *
  * Included by Hivelet.rc (through windres' C preprocessor) and by the module's C++ code, so it
  * holds nothing but plain #defines: one numeric range per kind of resource. */
 #ifndef HIVELET_RESOURCE_H
 #define HIVELET_RESOURCE_H
-
-/* Version: the numbers of the fixed version fields and the texts of the version strings. */
-#define HIVELET_VERSION_MAJOR 1
-#define HIVELET_VERSION_MINOR 0
-#define HIVELET_VERSION_PATCH 0
-#define HIVELET_VERSION_BUILD 2
-#define HIVELET_FILE_VERSION_TEXT "2.02"
-#define HIVELET_PRODUCT_VERSION_TEXT "1, 0, 0, 2"
-#define HIVELET_SPECIAL_BUILD_TEXT "00000002"
 
 /* Who makes the module: shared by strings 129/130 and the version block. */
 #define HIVELET_MAKER_TEXT "The Hivelet developers"

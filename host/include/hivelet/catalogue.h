@@ -84,4 +84,10 @@ private:
 // editor lists them.
 void printEditorView(Catalogue& catalogue, std::ostream& out);
 
+// The catalogue as data for tools such as the help file's generator, in JSON: the object's
+// identity strings and help file name, every event in menu order with its menu path, code,
+// routine, flags, display text and parameters, and the texts of the module's own error codes as
+// "RegErrText$(" gives them. Everything is read from the module through its entry points.
+void printCatalogueJson(Module& module, Catalogue& catalogue, std::ostream& out);
+
 }  // namespace hv
