@@ -15,10 +15,22 @@ const RootKey RootKeyTable[RootKeyCount + 1] = {
 };
 #undef ROOT
 
-DWORD RootIndexOf(const RootKeyParam* param) {
-    const BYTE* b = param->rootIndex;
-    return static_cast<DWORD>(b[0]) | static_cast<DWORD>(b[1]) << 8 |
-           static_cast<DWORD>(b[2]) << 16 | static_cast<DWORD>(b[3]) << 24;
+const RootKey* RootKeyAt(DWORD index) {
+    return index < RootKeyCount ? &RootKeyTable[index] : nullptr;
+}
+
+const WCHAR* RootNameAt(DWORD index) {
+    const RootKey* root = RootKeyAt(index);
+    return root ? root->name : EmptyString;
+}
+
+DWORD LoadRootIndex(const BYTE* field) {
+    return static_cast<DWORD>(field[0]) | static_cast<DWORD>(field[1]) << 8 |
+           static_cast<DWORD>(field[2]) << 16 | static_cast<DWORD>(field[3]) << 24;
+}
+
+void StoreRootIndex(BYTE* field, DWORD index) {
+    for (int i = 0; i < 4; ++i) field[i] = static_cast<BYTE>(index >> (8 * i));
 }
 
 // Case folding maps each character to one character, so only a name of the same length can be
@@ -36,20 +48,12 @@ DWORD RootKeyByName(const WCHAR* name) {
     return index;
 }
 
-static REGSAM WithView(const RunObjectData* instance, REGSAM access) {
-    return instance->use64BitView ? access | KEY_WOW64_64KEY : access;
-}
-
-REGSAM ReadAccess(const RunObjectData* instance) { return WithView(instance, KEY_READ); }
-
-REGSAM WriteAccess(const RunObjectData* instance) { return WithView(instance, KEY_ALL_ACCESS); }
-
 short WINAPI ActSetRootKey(RunObjectData* instance, HostValue param, HostValue) {
     instance->lastError = ERR_INVALID_PARAMETERS;
     const auto* record = reinterpret_cast<const RootKeyParam*>(param);
     if (!record) return 0;
     DWORD index = RootIndexOf(record);
-    if (index >= RootKeyCount) return 0;
+    if (!RootKeyAt(index)) return 0;
     instance->lastError = ERROR_SUCCESS;
     instance->rootKeyIndex = index;
     return 0;
@@ -79,8 +83,7 @@ short WINAPI ActSet64BitMode(RunObjectData* instance, HostValue param, HostValue
 }
 
 HostValue WINAPI ExpGetCurrentRootKey(RunObjectData* instance, HostValue) {
-    DWORD index = instance->rootKeyIndex;
-    return TextResult(instance, index < RootKeyCount ? RootKeyTable[index].name : EmptyString);
+    return TextResult(instance, RootNameAt(instance->rootKeyIndex));
 }
 
 HostValue WINAPI ExpGetCurrentKey(RunObjectData* instance, HostValue) {
