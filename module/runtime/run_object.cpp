@@ -57,13 +57,9 @@ HV_EXPORT short WINAPI DestroyRunObject(RunObjectData* instance, HostValue) {
 
 HV_EXPORT short WINAPI HandleRunObject(RunObjectData*) { return 1; }
 
-// Pausing, continuing and displaying need nothing from this object: one routine answers all.
+// Pausing, continuing and displaying need nothing from this object: one routine answers all
+// three, under the names that Hivelet.def gives it.
 HV_EXPORT short WINAPI IdleRunObject(RunObjectData*) { return 0; }
-#ifndef _WIN32  // Hivelet.def gives the Windows builds the three names
-HV_EXPORT short WINAPI PauseRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
-HV_EXPORT short WINAPI ContinueRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
-HV_EXPORT short WINAPI DisplayRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
-#endif
 
 // Writes every field of the block but the one byte that belongs to the host.
 HV_EXPORT short WINAPI GetRunObjectInfos(HostValue, RunObjectInfos* infos) {
