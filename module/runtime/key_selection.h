@@ -16,7 +16,9 @@ extern const RootKey RootKeyTable[RootKeyCount + 1];
 
 // The root at `index`, or null for an index of 5 or more: a loaded saved state or a
 // RootKeyParam record may hold any value, so every use of an index goes through here.
-const RootKey* RootKeyAt(DWORD index);
+inline const RootKey* RootKeyAt(DWORD index) {
+    return index < RootKeyCount ? &RootKeyTable[index] : nullptr;
+}
 
 // The root's display name, or EmptyString for an invalid index.
 const WCHAR* RootNameAt(DWORD index);
