@@ -31,6 +31,7 @@ bool Reach(RunObjectData* instance, KeyUse use, DWORD rootIndex, const WCHAR* pa
     return result == ERROR_SUCCESS;
 }
 
+// Until a registry call answers, the outcome of a routine that reports is "invalid parameters".
 void BeginReport(RunObjectData* instance, KeyUse use) {
     if (use != KeyUse::Test) instance->lastError = ERR_INVALID_PARAMETERS;
 }
@@ -46,12 +47,12 @@ bool ReachCurrentKey(RunObjectData* instance, KeyUse use, TargetKey* key, bool g
 bool ReachNamedKey(RunObjectData* instance, KeyUse use, HostValue rootKey, HostValue keyPath,
                    TargetKey* key, bool given) {
     BeginReport(instance, use);
-    const auto* param = reinterpret_cast<const RootKeyParam*>(rootKey);
+    const RootKeyParam* param = RootParam(rootKey);
     if (!param || !Text(keyPath) || !given) return false;
     return Reach(instance, use, RootIndexOf(param), Text(keyPath), key);
 }
 
-// The name is looked up before the path and value name are checked, as the readers' checks go.
+// The readers check the root name before the path and the value name.
 bool ReachKeyByRootName(RunObjectData* instance, const WCHAR* rootName, const WCHAR* path,
                         TargetKey* key, bool given) {
     BeginReport(instance, KeyUse::Read);

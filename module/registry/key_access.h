@@ -40,5 +40,3 @@ bool ReachNamedKey(RunObjectData* instance, KeyUse use, HostValue rootKey, HostV
 // The key below the root whose display name is `rootName`, opened for a reader.
 bool ReachKeyByRootName(RunObjectData* instance, const WCHAR* rootName, const WCHAR* path,
                         TargetKey* key, bool given = true);
-
-inline const WCHAR* Text(HostValue value) { return reinterpret_cast<const WCHAR*>(value); }

@@ -12,6 +12,12 @@ inline HostValue NextParameter(RunObjectData* instance) {
     return instance->header.runHeader->getNextParameter(instance, -1, 0);
 }
 
+// A parameter value as what it carries: a text, or the address of a RootKeyParam record.
+inline const WCHAR* Text(HostValue value) { return reinterpret_cast<const WCHAR*>(value); }
+inline const RootKeyParam* RootParam(HostValue value) {
+    return reinterpret_cast<const RootKeyParam*>(value);
+}
+
 // The running expression's first argument, then each further one in order.
 inline HostValue FirstExpressionParameter(RunObjectData* instance, HostValue hostValue) {
     return instance->header.runHeader->getFirstExpressionParameter(instance, 1, hostValue);

@@ -70,7 +70,7 @@ DWORD RootKeyByName(const WCHAR* name) {
 
 short WINAPI ActSetRootKey(RunObjectData* instance, HostValue param, HostValue) {
     instance->lastError = ERR_INVALID_PARAMETERS;
-    const auto* record = reinterpret_cast<const RootKeyParam*>(param);
+    const RootKeyParam* record = RootParam(param);
     if (!record) return 0;
     DWORD index = RootIndexOf(record);
     if (!RootKeyAt(index)) return 0;
@@ -83,7 +83,7 @@ short WINAPI ActSetRootKey(RunObjectData* instance, HostValue param, HostValue) 
 // When no copy can be had the old key stays and the failure is reported, not hidden.
 short WINAPI ActSetCurrentKey(RunObjectData* instance, HostValue param, HostValue) {
     instance->lastError = ERR_INVALID_PARAMETERS;
-    const auto* text = reinterpret_cast<const WCHAR*>(param);
+    const WCHAR* text = Text(param);
     if (!text) return 0;
     auto* copy = static_cast<WCHAR*>(calloc(wcslen(text) + 1, sizeof(WCHAR)));
     if (!copy) {
