@@ -5,7 +5,8 @@
 
 namespace {
 
-// Asks only whether the value is there: no data buffer, whatever its type and size.
+// Asks only whether the value is there (no data buffer, whatever its type and size), then
+// closes the key.
 bool ValueIsThere(HKEY key, const WCHAR* name) {
     DWORD type, size;
     LONG result = RegQueryValueExW(key, name, nullptr, &type, nullptr, &size);

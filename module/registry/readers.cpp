@@ -8,7 +8,8 @@
 
 namespace {
 
-// A value shorter than four bytes leaves the high bytes of the result zero, not undefined.
+// Reads a DWORD value of the open key, then closes the key. A value shorter than four bytes
+// leaves the high bytes of the result zero, not undefined.
 LONG ReadDword(RunObjectData* instance, HKEY key, const WCHAR* name) {
     DWORD value = 0, type = 0, size = sizeof(value);
     LONG result = RegQueryValueExW(key, name, nullptr, &type, reinterpret_cast<BYTE*>(&value),
@@ -53,6 +54,7 @@ const WCHAR* ReadStringFromKey(RunObjectData* instance, HKEY key, const WCHAR* n
     return buffer;
 }
 
+// Reads a string value of the open key as the expression's text result, then closes the key.
 HostValue ReadString(RunObjectData* instance, HKEY key, const WCHAR* name) {
     const WCHAR* text = ReadStringFromKey(instance, key, name);
     RegCloseKey(key);
