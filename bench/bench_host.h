@@ -1,10 +1,11 @@
-// A bare host for timing the module: it loads Hivelet.hzx as the host does, lays out one
-// instance record and its run header, and answers the run header's services from values
-// prepared before the timed loop. Unlike the host simulator it checks nothing around a call,
-// so what a benchmark times is the routine and the registry calls the routine makes.
+// A bare host for timing the module. The host library loads the module and reads its routine
+// tables (hv::Module); this host lays out one instance record and its run header and answers
+// the run header's services from values prepared before the timed loop. Unlike the host
+// simulator's hv::Instance it checks nothing around a call, so what a benchmark times is the
+// routine and the registry calls the routine makes.
 #pragma once
 
-#include <windows.h>
+#include <hivelet/host.h>
 
 #include <cstddef>
 #include <cstdint>
@@ -13,58 +14,20 @@
 
 namespace bench {
 
-// A value in a pointer-sized slot: parameter values, the expression host value, results.
-using Slot = intptr_t;
+using hv::Slot;
 
 typedef short(WINAPI* ActionRoutine)(void* record, Slot first, Slot second);
 typedef Slot(WINAPI* ExpressionRoutine)(void* record, Slot hostValue);
 
-// Event codes of the routines the benchmarks call.
-namespace action {
-constexpr int SetRootKey = 0, SetCurrentKey = 1, SetCurrentDword = 2, SetCurrentString = 3,
-              SetDword = 4, SetString = 5, DeleteKey = 8, CreateCurrentKey = 10, CreateKey = 11;
-}
-namespace expression {
-constexpr int GetCurrentDword = 2, GetCurrentString = 3, GetDword = 4, GetString = 5;
-}
-
-// The module, loaded with LoadLibraryW and released with FreeLibrary.
-class Module {
-public:
-    // Loads the module at `path`; on failure `ok()` is false and `error()` tells why.
-    explicit Module(const std::string& path);
-    ~Module();
-    Module(const Module&) = delete;
-    Module& operator=(const Module&) = delete;
-
-    bool ok() const { return error_.empty(); }
-    const std::string& error() const { return error_; }
-
-    ActionRoutine action(int code) const;
-    ExpressionRoutine expression(int code) const;
-
-private:
-    friend class Instance;
-    typedef short(WINAPI* DataSizeEntry)(Slot, Slot);
-    typedef short(WINAPI* CreateEntry)(void*, Slot, Slot);
-    typedef short(WINAPI* DestroyEntry)(void*, Slot);
-    typedef short(WINAPI* InfosEntry)(Slot, void*);
-
-    HMODULE handle_ = nullptr;
-    std::string error_;
-    size_t recordSize_ = 0;
-    CreateEntry create_ = nullptr;
-    DestroyEntry destroy_ = nullptr;
-    const Slot* actions_ = nullptr;
-    const Slot* expressions_ = nullptr;
-    unsigned actionCount_ = 0, expressionCount_ = 0;
-};
+// The routine of that name from the module's tables, or null when there is none.
+ActionRoutine actionRoutine(const hv::Module& module, const char* routine);
+ExpressionRoutine expressionRoutine(const hv::Module& module, const char* routine);
 
 // One object instance with its run header. The services read the instance back from the
 // record's first host-owned bytes, so several instances can live side by side.
 class Instance {
 public:
-    explicit Instance(Module& module);
+    explicit Instance(hv::Module& module);
     ~Instance();
     Instance(const Instance&) = delete;
     Instance& operator=(const Instance&) = delete;
@@ -82,6 +45,10 @@ public:
     bool textResult() const;
 
 private:
+    typedef short(WINAPI* DataSizeEntry)(Slot, Slot);
+    typedef short(WINAPI* CreateEntry)(void*, Slot, Slot);
+    typedef short(WINAPI* DestroyEntry)(void*, Slot);
+
     static Slot WINAPI nextParameter(void* record, int allBits, int zero);
     static Slot WINAPI firstExpressionParameter(void* record, int one, Slot hostValue);
     static Slot WINAPI nextExpressionParameter(void* record, int one, Slot hostValue);
@@ -89,7 +56,7 @@ private:
     static Instance* owner(void* record);
     Slot take();
 
-    Module& module_;
+    DestroyEntry destroy_;
     std::vector<uint8_t> record_;
     std::vector<uint8_t> runHeader_;
     uint16_t* flags_;
@@ -103,15 +70,12 @@ private:
 // A RootKeyParam record as the editor stores it, for the root at `index`.
 class RootKeyRecord {
 public:
-    explicit RootKeyRecord(uint32_t index);
-    Slot slot() const { return reinterpret_cast<Slot>(bytes_); }
+    explicit RootKeyRecord(uint32_t index) : bytes_(hv::rootKeyRecord(index)) {}
+    Slot slot() const { return reinterpret_cast<Slot>(bytes_.data()); }
 
 private:
-    uint8_t bytes_[16];
+    std::vector<uint8_t> bytes_;
 };
-
-// Hivelet.hzx beside the running program, unless HIVELET_MODULE names another file.
-std::string defaultModulePath();
 
 inline Slot textSlot(const WCHAR* text) { return reinterpret_cast<Slot>(text); }
 

@@ -205,4 +205,17 @@ bool RatioReporter::printSummary(std::ostream& out, double pairTarget) const {
     return complete;
 }
 
+void RatioReporter::printRatios(std::ostream& out) const {
+    char line[120];
+    for (const Pair& p : pairs_) {
+        if (!ran(p.side)) continue;
+        double ratio = 0;
+        if (typical(p.side, &ratio, "ratio"))
+            std::snprintf(line, sizeof(line), "ratio %s %.3f\n", p.routine.c_str(), ratio);
+        else
+            std::snprintf(line, sizeof(line), "ratio %s -\n", p.routine.c_str());
+        out << line;
+    }
+}
+
 }  // namespace bench

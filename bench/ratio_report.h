@@ -36,6 +36,9 @@ public:
     // Prints the tables of the benchmarks that ran; returns false when one of them failed or
     // its counterpart is missing.
     bool printSummary(std::ostream& out, double pairTarget) const;
+    // One line per routine compared, "ratio <Routine> <module/raw>", the side-by-side ratio with
+    // three decimals ("-" when it was not measured): the lines a run is judged by.
+    void printRatios(std::ostream& out) const;
 
 private:
     // One value of a benchmark over its repetitions: the median aggregate when Google Benchmark

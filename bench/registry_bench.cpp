@@ -13,6 +13,7 @@
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <functional>
 #include <iostream>
@@ -213,17 +214,20 @@ bool keyExists(const WCHAR* path) {
 // Everything the benchmarks share: the module, one instance whose current key is the settings
 // key under HKEY_CURRENT_USER, and a RootKeyParam record for that root.
 struct Fixture {
-    bench::Module& module;
+    hv::Module& module;
     bench::Instance instance;
     bench::RootKeyRecord currentUser{kCurrentUser};
     WCHAR rawBuffer[256] = {};
 
-    explicit Fixture(bench::Module& m) : module(m), instance(m) {}
+    explicit Fixture(hv::Module& m) : module(m), instance(m) {}
 
     bool selectSettings() {
-        module.action(bench::action::SetRootKey)(instance.record(), currentUser.slot(), 0);
+        auto setRootKey = bench::actionRoutine(module, "ActSetRootKey");
+        auto setCurrentKey = bench::actionRoutine(module, "ActSetCurrentKey");
+        if (!setRootKey || !setCurrentKey) return false;
+        setRootKey(instance.record(), currentUser.slot(), 0);
         if (instance.lastError() != 0) return false;
-        module.action(bench::action::SetCurrentKey)(instance.record(), textSlot(kSettings), 0);
+        setCurrentKey(instance.record(), textSlot(kSettings), 0);
         return instance.lastError() == 0;
     }
 };
@@ -406,7 +410,7 @@ void registerDeletion(Fixture& f, bench::RatioReporter& reporter, const std::str
                       const std::string& label, unsigned keys, int iterations,
                       std::function<bool()> build, const WCHAR* path) {
     bench::Instance* instance = &f.instance;
-    bench::ActionRoutine deleteKey = f.module.action(bench::action::DeleteKey);
+    bench::ActionRoutine deleteKey = bench::actionRoutine(f.module, "ActDeleteKey");
     Slot root = f.currentUser.slot();
     benchmark::RegisterBenchmark(name.c_str(), [=](benchmark::State& state) {
         double total = 0, fastest = 0;
@@ -470,6 +474,16 @@ void registerRawDeletion(bench::RatioReporter& reporter, const std::string& name
     reporter.perUnit(name, label, keys);
 }
 
+// A routine the module's tables must have; the program stops when they lack it.
+template <typename Routine>
+Routine found(Routine routine, const char* name) {
+    if (!routine) {
+        std::cerr << "hivelet_bench: the module has no routine " << name << "\n";
+        std::exit(1);
+    }
+    return routine;
+}
+
 // Google Benchmark's flags as this program uses them by default; the command line comes after
 // them and so overrides any of them.
 std::vector<char*> withDefaults(int argc, char** argv, std::vector<std::string>& storage) {
@@ -531,11 +545,13 @@ bool addOwnWork(bench::RatioReporter& reporter, bench::Instance& in, const std::
 
 int main(int argc, char** argv) {
     w32test::setJournal(false);
-    bench::Module module(bench::defaultModulePath());
-    if (!module.ok()) {
-        std::cerr << "hivelet_bench: " << module.error() << "\n";
+    std::string error;
+    std::unique_ptr<hv::Module> loaded = hv::Module::load(hv::defaultModulePath(), &error);
+    if (!loaded) {
+        std::cerr << "hivelet_bench: " << error << "\n";
         return 1;
     }
+    hv::Module& module = *loaded;
     auto fixture = std::make_unique<Fixture>(module);
     Fixture& f = *fixture;
     if (!prepareValues() || !f.selectSettings()) {
@@ -547,11 +563,12 @@ int main(int argc, char** argv) {
     bench::Instance* instance = &in;
     const Slot root = f.currentUser.slot();
     WCHAR* rawBuffer = f.rawBuffer;
-    namespace A = bench::action;
-    namespace E = bench::expression;
-    auto expression = [&](int code) { return ExpressionCall{instance, module.expression(code)}; };
-    auto action = [&](int code, Slot first = 0, Slot second = 0) {
-        return ActionCall{instance, module.action(code), first, second};
+    auto expression = [&](const char* routine) {
+        return ExpressionCall{instance, found(bench::expressionRoutine(module, routine), routine)};
+    };
+    auto action = [&](const char* routine, Slot first = 0, Slot second = 0) {
+        return ActionCall{instance, found(bench::actionRoutine(module, routine), routine), first,
+                          second};
     };
     auto parameters = [&in](std::vector<Slot> values) -> Prepare {
         return [&in, values] { in.setParameters(values); };
@@ -590,32 +607,32 @@ int main(int argc, char** argv) {
     const Slot label = textSlot(kLabel);
     bool ok = true;
     ok &= addRoutine(reporter, "ExpGetCurrentDword", "OpenQueryDwordClose",
-                     parameters({dwordName}), expression(E::GetCurrentDword), readDword,
+                     parameters({dwordName}), expression("ExpGetCurrentDword"), readDword,
                      dwordRead);
     ok &= addRoutine(reporter, "ExpGetCurrentString", "OpenProbeQueryStringClose",
-                     parameters({stringName}), expression(E::GetCurrentString), readString,
+                     parameters({stringName}), expression("ExpGetCurrentString"), readString,
                      stringRead);
     ok &= addRoutine(reporter, "ExpGetDword", "OpenQueryDwordClose",
-                     parameters({rootName, path, dwordName}), expression(E::GetDword), readDword,
-                     dwordRead);
+                     parameters({rootName, path, dwordName}), expression("ExpGetDword"),
+                     readDword, dwordRead);
     ok &= addRoutine(reporter, "ExpGetString", "OpenProbeQueryStringClose",
-                     parameters({rootName, path, stringName}), expression(E::GetString),
+                     parameters({rootName, path, stringName}), expression("ExpGetString"),
                      readString, stringRead);
     ok &= addRoutine(reporter, "ActSetCurrentDword", "CreateSetDwordClose", none,
-                     action(A::SetCurrentDword, dwordTarget, kWrittenDword), writeDword,
+                     action("ActSetCurrentDword", dwordTarget, kWrittenDword), writeDword,
                      succeeded);
     ok &= addRoutine(reporter, "ActSetCurrentString", "CreateProbeSetStringClose", none,
-                     action(A::SetCurrentString, stringTarget, label), writeString, succeeded);
+                     action("ActSetCurrentString", stringTarget, label), writeString, succeeded);
     ok &= addRoutine(reporter, "ActSetDword", "CreateSetDwordClose",
-                     parameters({root, path, dwordTarget, kWrittenDword}), action(A::SetDword),
+                     parameters({root, path, dwordTarget, kWrittenDword}), action("ActSetDword"),
                      writeDword, succeeded);
     ok &= addRoutine(reporter, "ActSetString", "CreateProbeSetStringClose",
-                     parameters({root, path, stringTarget, label}), action(A::SetString),
+                     parameters({root, path, stringTarget, label}), action("ActSetString"),
                      writeString, succeeded);
     ok &= addRoutine(reporter, "ActCreateCurrentKey", "CreateClose", none,
-                     action(A::CreateCurrentKey), createKey, succeeded);
+                     action("ActCreateCurrentKey"), createKey, succeeded);
     ok &= addRoutine(reporter, "ActCreateKey", "CreateClose", parameters({root, path}),
-                     action(A::CreateKey), createKey, succeeded);
+                     action("ActCreateKey"), createKey, succeeded);
     registerRaw("Raw/OpenQueryDwordClose", readDword);
     registerRaw("Raw/OpenProbeQueryStringClose", readString);
     registerRaw("Raw/CreateSetDwordClose", writeDword);
@@ -623,22 +640,22 @@ int main(int argc, char** argv) {
     registerRaw("Raw/CreateClose", createKey);
 
     ok &= addOwnWork(reporter, in, "ExpGetCurrentDword", parameters({0}),
-                     expression(E::GetCurrentDword));
+                     expression("ExpGetCurrentDword"));
     ok &= addOwnWork(reporter, in, "ExpGetCurrentString", parameters({0}),
-                     expression(E::GetCurrentString));
+                     expression("ExpGetCurrentString"));
     ok &= addOwnWork(reporter, in, "ExpGetDword", parameters({rootName, 0, dwordName}),
-                     expression(E::GetDword));
+                     expression("ExpGetDword"));
     ok &= addOwnWork(reporter, in, "ExpGetString", parameters({rootName, 0, stringName}),
-                     expression(E::GetString));
+                     expression("ExpGetString"));
     ok &= addOwnWork(reporter, in, "ActSetCurrentDword", none,
-                     action(A::SetCurrentDword, 0, kWrittenDword));
+                     action("ActSetCurrentDword", 0, kWrittenDword));
     ok &= addOwnWork(reporter, in, "ActSetCurrentString", none,
-                     action(A::SetCurrentString, stringTarget, 0));
+                     action("ActSetCurrentString", stringTarget, 0));
     ok &= addOwnWork(reporter, in, "ActSetDword",
-                     parameters({root, 0, dwordTarget, kWrittenDword}), action(A::SetDword));
+                     parameters({root, 0, dwordTarget, kWrittenDword}), action("ActSetDword"));
     ok &= addOwnWork(reporter, in, "ActSetString", parameters({root, 0, stringTarget, label}),
-                     action(A::SetString));
-    ok &= addOwnWork(reporter, in, "ActCreateKey", parameters({root, 0}), action(A::CreateKey));
+                     action("ActSetString"));
+    ok &= addOwnWork(reporter, in, "ActCreateKey", parameters({root, 0}), action("ActCreateKey"));
     if (!ok) return 1;
     std::cout << "Checked: each routine makes the same registry calls as its raw sequence.\n";
 
@@ -664,6 +681,8 @@ int main(int argc, char** argv) {
     if (benchmark::ReportUnrecognizedArguments(count, args.data())) return 1;
     benchmark::RunSpecifiedBenchmarks(&reporter);
     reporter.printSummary(std::cout, kPairTarget);
+    std::cout << "\n";
+    reporter.printRatios(std::cout);
     benchmark::Shutdown();
     return 0;
 }

@@ -1,5 +1,7 @@
 # Build settings shared by every target of the project.
 
+include(ModulePlatform)
+
 # Warnings as errors on our own code, for every compiler we build with.
 function(hv_warnings target)
   target_compile_options(${target} PRIVATE -Wall -Wextra -Werror -Wshadow -Wno-missing-field-initializers)

@@ -5,7 +5,7 @@
 #include <stddef.h>
 #include <stdint.h>
 
-#include "../win32/src/menus.h"
+#include "menus.h"
 
 namespace {
 

@@ -1,9 +1,6 @@
-// How the module's entry points are exported: by name, C linkage, the Windows calling convention.
-// The Windows builds name them in Hivelet.def; the Linux builds export them from the ELF image.
+// How the module's entry points are declared: C linkage and the Windows calling convention.
+// Which of them are exported, and under which names, is Hivelet.def's business: the Windows
+// builds link it, the Linux builds an ELF version script made from it.
 #pragma once
 
-#ifdef _WIN32
 #define HV_EXPORT extern "C"
-#else
-#define HV_EXPORT extern "C" __attribute__((visibility("default")))
-#endif

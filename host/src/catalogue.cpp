@@ -93,11 +93,7 @@ std::string paramTypeName(int16_t type) {
 }
 
 int Catalogue::eventCount(EventKind kind) {
-    switch (kind) {
-        case EventKind::Condition: return 5;
-        case EventKind::Action: return 13;
-        default: return 8;
-    }
+    return static_cast<int>(routineNames(kind).size());
 }
 
 HMENU Catalogue::menu(EventKind kind) {

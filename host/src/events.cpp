@@ -1,6 +1,8 @@
-// What the host knows about the object's events: routine names in code order and how many
-// parameters the editor stores for each; the parameter values it builds.
+// What the host knows about the object's events, from the module's event list: routine names
+// in code order and how many parameters the editor stores for each; the parameter values it
+// builds.
 #include <hivelet/host.h>
+#include <hivelet_events.h>
 
 #include <utility>
 
@@ -13,24 +15,14 @@ struct Routine {
     int parameters;
 };
 
-// The routines of one kind in code order, with the number of parameters of each.
+// The routines of one kind in code order, with the number of parameters of each, as the
+// module's event list gives them.
 const std::vector<Routine>& routines(EventKind kind) {
-    static const std::vector<Routine> conditions = {
-        {"CndKeyExists", 2},          {"CndValueExists", 3},          {"CndCurrentKeyExists", 0},
-        {"CndCurrentValueExists", 1}, {"CndLastActionSuccessful", 0},
-    };
-    static const std::vector<Routine> actions = {
-        {"ActSetRootKey", 1},       {"ActSetCurrentKey", 1},      {"ActSetCurrentDword", 2},
-        {"ActSetCurrentString", 2}, {"ActSetDword", 4},           {"ActSetString", 4},
-        {"ActDeleteCurrentKey", 0}, {"ActDeleteCurrentValue", 1}, {"ActDeleteKey", 2},
-        {"ActDeleteValue", 3},      {"ActCreateCurrentKey", 0},   {"ActCreateKey", 2},
-        {"ActSet64BitMode", 1},
-    };
-    static const std::vector<Routine> expressions = {
-        {"ExpGetCurrentRootKey", 0}, {"ExpGetCurrentKey", 0},    {"ExpGetCurrentDword", 1},
-        {"ExpGetCurrentString", 1},  {"ExpGetDword", 3},         {"ExpGetString", 3},
-        {"ExpLastErrorCode", 0},     {"ExpLastErrorMessage", 0},
-    };
+#define HV_ROUTINE(code, routine, parameters) {#routine, parameters},
+    static const std::vector<Routine> conditions = {HV_CONDITIONS(HV_ROUTINE)};
+    static const std::vector<Routine> actions = {HV_ACTIONS(HV_ROUTINE)};
+    static const std::vector<Routine> expressions = {HV_EXPRESSIONS(HV_ROUTINE)};
+#undef HV_ROUTINE
     switch (kind) {
         case EventKind::Condition: return conditions;
         case EventKind::Action: return actions;

@@ -1,5 +1,7 @@
 // The event catalogue the editor reads: for every condition, action and expression its menu item,
 // display text, flags, parameter types and parameter titles, and the menus the author picks from.
+#include <hivelet_events.h>
+
 #include "module_entry.h"
 
 #include "../resources/resource.h"
@@ -93,26 +95,35 @@ const int ParamTypesWord = 5;
 // Words of an entry with `paramCount` parameters.
 constexpr size_t EntryWords(short paramCount) { return 5 + 2 * static_cast<size_t>(paramCount); }
 
-// Checks at build time that a table is `count` well-formed entries in code order, filling it
-// exactly.
-template <size_t N>
-constexpr bool WellFormed(const short (&table)[N], int count) {
+// How many parameters the event list gives each event, in code order.
+#define HV_PARAMETERS(code, routine, parameters) parameters,
+constexpr short ConditionParameters[] = {HV_CONDITIONS(HV_PARAMETERS)};
+constexpr short ActionParameters[] = {HV_ACTIONS(HV_PARAMETERS)};
+constexpr short ExpressionParameters[] = {HV_EXPRESSIONS(HV_PARAMETERS)};
+#undef HV_PARAMETERS
+
+// Checks at build time that a table holds one well-formed entry per event of the list, in code
+// order, each with the list's number of parameters, and nothing after them.
+template <size_t N, size_t Events>
+constexpr bool MatchesEventList(const short (&table)[N], const short (&parameters)[Events]) {
     size_t at = 0;
-    for (int code = 0; code < count; ++code) {
-        if (at + EntryWords(0) > N || table[at + CodeWord] != code) return false;
-        short params = table[at + ParamCountWord];
-        if (params < 0 || params > 4) return false;
-        at += EntryWords(params);
+    for (size_t code = 0; code < Events; ++code) {
+        if (at + EntryWords(0) > N || table[at + CodeWord] != static_cast<short>(code))
+            return false;
+        short count = parameters[code];
+        if (count < 0 || count > 4 || table[at + ParamCountWord] != count) return false;
+        at += EntryWords(count);
     }
     return at == N;
 }
 
-const int ConditionCount = 5;
-const int ActionCount = 13;
-const int ExpressionCount = 8;
-static_assert(WellFormed(ConditionInfoTable, ConditionCount), "condition table");
-static_assert(WellFormed(ActionInfoTable, ActionCount), "action table");
-static_assert(WellFormed(ExpressionInfoTable, ExpressionCount), "expression table");
+static_assert(MatchesEventList(ConditionInfoTable, ConditionParameters), "condition table");
+static_assert(MatchesEventList(ActionInfoTable, ActionParameters), "action table");
+static_assert(MatchesEventList(ExpressionInfoTable, ExpressionParameters), "expression table");
+
+const int ConditionCount = sizeof(ConditionParameters) / sizeof(ConditionParameters[0]);
+const int ActionCount = sizeof(ActionParameters) / sizeof(ActionParameters[0]);
+const int ExpressionCount = sizeof(ExpressionParameters) / sizeof(ExpressionParameters[0]);
 
 // One table with its size and its menu.
 struct Catalogue {

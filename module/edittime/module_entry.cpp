@@ -17,13 +17,8 @@ const DWORD MinimumVersion = 0x02000000;    // high 16 bits
 
 }  // namespace
 
-extern "C" BOOL WINAPI DllMain(HINSTANCE instance, DWORD reason, LPVOID)
-#ifndef _WIN32
-    __attribute__((visibility("default")))
-#endif
-    ;
-
-BOOL WINAPI DllMain(HINSTANCE instance, DWORD reason, LPVOID) {
+// The library's entry function, which the system calls by this name.
+extern "C" BOOL WINAPI DllMain(HINSTANCE instance, DWORD reason, LPVOID) {
     if (reason == DLL_PROCESS_ATTACH) moduleInstance = instance;
     return TRUE;
 }

@@ -9,16 +9,6 @@
 
 namespace {
 
-// The record's index is a little-endian u32 at an odd place; it is read and written bytewise.
-void StoreRootIndex(BYTE* at, DWORD index) {
-    for (int i = 0; i < 4; ++i) at[i] = static_cast<BYTE>(index >> (8 * i));
-}
-
-DWORD LoadRootIndex(const BYTE* at) {
-    return static_cast<DWORD>(at[0]) | static_cast<DWORD>(at[1]) << 8 |
-           static_cast<DWORD>(at[2]) << 16 | static_cast<DWORD>(at[3]) << 24;
-}
-
 // Fills the list with the root names in table order and selects the record's root.
 void InitRootKeyDialog(HWND dialog, BYTE* rootIndex) {
     SetWindowLongPtrW(dialog, DWLP_USER, reinterpret_cast<LONG_PTR>(rootIndex));
@@ -27,7 +17,7 @@ void InitRootKeyDialog(HWND dialog, BYTE* rootIndex) {
         SendMessageW(list, LB_ADDSTRING, 0, reinterpret_cast<LPARAM>(root->name));
     DWORD index = LoadRootIndex(rootIndex);
     // Without a valid index nothing is selected; -1 also clears any selection.
-    WPARAM position = index < RootKeyCount ? index : static_cast<WPARAM>(-1);
+    WPARAM position = RootKeyAt(index) ? index : static_cast<WPARAM>(-1);
     SendMessageW(list, LB_SETCURSEL, position, 0);
 }
 
@@ -70,10 +60,10 @@ HV_EXPORT INT_PTR WINAPI EditParameter(const EditorStructure* editor, HostValue,
 // the last character of the capacity is always zero, and nothing is written past it.
 HV_EXPORT void WINAPI GetParameterString(HostValue, HostValue, const RootKeyParam* param,
                                          LPWSTR buffer, HostValue capacity) {
-    DWORD index = RootIndexOf(param);
-    if (index >= RootKeyCount) return;
+    const RootKey* root = RootKeyAt(RootIndexOf(param));
+    if (!root) return;
     auto count = static_cast<short>(static_cast<WORD>(capacity));
     if (count <= 0) return;
-    wcsncpy(buffer, RootKeyTable[index].name, static_cast<size_t>(count));
+    wcsncpy(buffer, root->name, static_cast<size_t>(count));
     buffer[count - 1] = 0;
 }

@@ -4,7 +4,7 @@
 #include <wchar.h>
 
 #include "../runtime/routines.h"
-#include "registry_access.h"
+#include "key_access.h"
 
 namespace {
 
@@ -108,54 +108,46 @@ bool IsWindowsNt() {
     return GetVersionExW(&version) && version.dwPlatformId == VER_PLATFORM_WIN32_NT;
 }
 
-void DeleteKey(RunObjectData* instance, HKEY root, const WCHAR* path) {
-    LONG result = IsWindowsNt() ? DeleteKeyWithView(root, path, instance->use64BitView)
-                                : RegDeleteKeyW(root, path);
+void DeleteKey(RunObjectData* instance, const TargetKey& key) {
+    LONG result = IsWindowsNt() ? DeleteKeyWithView(key.root, key.path, instance->use64BitView)
+                                : RegDeleteKeyW(key.root, key.path);
     instance->lastError = static_cast<DWORD>(result);
 }
 
-// Opens the key (never creates it) with write access and deletes one value.
-void DeleteValue(RunObjectData* instance, HKEY root, const WCHAR* path, const WCHAR* name) {
-    HKEY key;
-    LONG result = RegOpenKeyExW(root, path, 0, WriteAccess(instance), &key);
-    instance->lastError = static_cast<DWORD>(result);
-    if (result != ERROR_SUCCESS) return;
-    instance->lastError = static_cast<DWORD>(RegDeleteValueW(key, name));
-    RegCloseKey(key);
+// Deletes one value of the key opened for it, and closes the key.
+void DeleteValue(RunObjectData* instance, const TargetKey& key, const WCHAR* name) {
+    instance->lastError = static_cast<DWORD>(RegDeleteValueW(key.handle, name));
+    RegCloseKey(key.handle);
 }
 
 }  // namespace
 
 short WINAPI ActDeleteCurrentKey(RunObjectData* instance, HostValue, HostValue) {
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!CurrentKeyIsUsable(instance)) return 0;
-    DeleteKey(instance, CurrentRoot(instance), instance->currentKey);
+    TargetKey key;
+    if (ReachCurrentKey(instance, KeyUse::Delete, &key)) DeleteKey(instance, key);
     return 0;
 }
 
 short WINAPI ActDeleteCurrentValue(RunObjectData* instance, HostValue valueName, HostValue) {
     const WCHAR* name = Text(valueName);
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!instance->currentKey || !name || instance->rootKeyIndex >= RootKeyCount) return 0;
-    DeleteValue(instance, CurrentRoot(instance), instance->currentKey, name);
+    TargetKey key;
+    if (ReachCurrentKey(instance, KeyUse::Change, &key, name != nullptr))
+        DeleteValue(instance, key, name);
     return 0;
 }
 
 short WINAPI ActDeleteKey(RunObjectData* instance, HostValue rootKey, HostValue keyPath) {
-    const RootKeyParam* param = RootParam(rootKey);
-    const WCHAR* path = Text(keyPath);
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!param || !path || RootIndexOf(param) >= RootKeyCount) return 0;
-    DeleteKey(instance, RootKeyTable[RootIndexOf(param)].handle, path);
+    TargetKey key;
+    if (ReachNamedKey(instance, KeyUse::Delete, rootKey, keyPath, &key)) DeleteKey(instance, key);
     return 0;
 }
 
 short WINAPI ActDeleteValue(RunObjectData* instance, HostValue, HostValue) {
-    const RootKeyParam* param = RootParam(NextParameter(instance));
-    const WCHAR* path = Text(NextParameter(instance));
+    HostValue rootKey = NextParameter(instance);
+    HostValue keyPath = NextParameter(instance);
     const WCHAR* name = Text(NextParameter(instance));
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!param || !path || !name || RootIndexOf(param) >= RootKeyCount) return 0;
-    DeleteValue(instance, RootKeyTable[RootIndexOf(param)].handle, path, name);
+    TargetKey key;
+    if (ReachNamedKey(instance, KeyUse::Change, rootKey, keyPath, &key, name != nullptr))
+        DeleteValue(instance, key, name);
     return 0;
 }

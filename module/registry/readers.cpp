@@ -4,21 +4,13 @@
 #include <string.h>
 
 #include "../runtime/routines.h"
-#include "registry_access.h"
+#include "key_access.h"
 
 namespace {
 
-// Opens the key for reading; lastError takes the open's result.
-bool OpenForReading(RunObjectData* instance, HKEY root, const WCHAR* path, HKEY* key) {
-    instance->lastError = static_cast<DWORD>(
-        RegOpenKeyExW(root, path, 0, ReadAccess(instance), key));
-    return instance->lastError == ERROR_SUCCESS;
-}
-
-// A value shorter than four bytes leaves the high bytes of the result zero, not undefined.
-LONG ReadDword(RunObjectData* instance, HKEY root, const WCHAR* path, const WCHAR* name) {
-    HKEY key;
-    if (!OpenForReading(instance, root, path, &key)) return 0;
+// Reads a DWORD value of the open key, then closes the key. A value shorter than four bytes
+// leaves the high bytes of the result zero, not undefined.
+LONG ReadDword(RunObjectData* instance, HKEY key, const WCHAR* name) {
     DWORD value = 0, type = 0, size = sizeof(value);
     LONG result = RegQueryValueExW(key, name, nullptr, &type, reinterpret_cast<BYTE*>(&value),
                                    &size);
@@ -62,69 +54,59 @@ const WCHAR* ReadStringFromKey(RunObjectData* instance, HKEY key, const WCHAR* n
     return buffer;
 }
 
-HostValue ReadString(RunObjectData* instance, HKEY root, const WCHAR* path, const WCHAR* name) {
-    HKEY key;
-    if (!OpenForReading(instance, root, path, &key)) return TextResult(instance, EmptyString);
+// Reads a string value of the open key as the expression's text result, then closes the key.
+HostValue ReadString(RunObjectData* instance, HKEY key, const WCHAR* name) {
     const WCHAR* text = ReadStringFromKey(instance, key, name);
     RegCloseKey(key);
     return TextResult(instance, text);
 }
 
 // The named-key readers' arguments, all fetched before anything is tested.
-struct NamedKey {
+struct NamedValue {
     const WCHAR* rootName;
     const WCHAR* path;
     const WCHAR* name;
-    DWORD index;
 };
 
-NamedKey FetchNamedKey(RunObjectData* instance, HostValue hostValue) {
-    NamedKey k;
-    k.rootName = Text(FirstExpressionParameter(instance, hostValue));
-    k.path = Text(NextExpressionParameter(instance, hostValue));
-    k.name = Text(NextExpressionParameter(instance, hostValue));
-    k.index = RootKeyCount;
-    return k;
+NamedValue FetchNamedValue(RunObjectData* instance, HostValue hostValue) {
+    NamedValue v;
+    v.rootName = Text(FirstExpressionParameter(instance, hostValue));
+    v.path = Text(NextExpressionParameter(instance, hostValue));
+    v.name = Text(NextExpressionParameter(instance, hostValue));
+    return v;
 }
 
-// Checks in the readers' order: root name present, root name known, then path and value name.
-bool NamedKeyIsUsable(NamedKey* k) {
-    if (!k->rootName) return false;
-    k->index = RootKeyByName(k->rootName);
-    if (k->index >= RootKeyCount) return false;
-    return k->path && k->name;
-}
-
-bool CurrentValueIsUsable(const RunObjectData* instance, const WCHAR* name) {
-    return instance->currentKey && name && instance->rootKeyIndex < RootKeyCount;
+bool ReachNamedValue(RunObjectData* instance, const NamedValue& v, TargetKey* key) {
+    return ReachKeyByRootName(instance, v.rootName, v.path, key, v.name != nullptr);
 }
 
 }  // namespace
 
 HostValue WINAPI ExpGetCurrentDword(RunObjectData* instance, HostValue hostValue) {
     const WCHAR* name = Text(FirstExpressionParameter(instance, hostValue));
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!CurrentValueIsUsable(instance, name)) return 0;
-    return ReadDword(instance, CurrentRoot(instance), instance->currentKey, name);
+    TargetKey key;
+    if (!ReachCurrentKey(instance, KeyUse::Read, &key, name != nullptr)) return 0;
+    return ReadDword(instance, key.handle, name);
 }
 
 HostValue WINAPI ExpGetCurrentString(RunObjectData* instance, HostValue hostValue) {
     const WCHAR* name = Text(FirstExpressionParameter(instance, hostValue));
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!CurrentValueIsUsable(instance, name)) return TextResult(instance, EmptyString);
-    return ReadString(instance, CurrentRoot(instance), instance->currentKey, name);
+    TargetKey key;
+    if (!ReachCurrentKey(instance, KeyUse::Read, &key, name != nullptr))
+        return TextResult(instance, EmptyString);
+    return ReadString(instance, key.handle, name);
 }
 
 HostValue WINAPI ExpGetDword(RunObjectData* instance, HostValue hostValue) {
-    NamedKey k = FetchNamedKey(instance, hostValue);
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!NamedKeyIsUsable(&k)) return 0;
-    return ReadDword(instance, RootKeyTable[k.index].handle, k.path, k.name);
+    NamedValue v = FetchNamedValue(instance, hostValue);
+    TargetKey key;
+    if (!ReachNamedValue(instance, v, &key)) return 0;
+    return ReadDword(instance, key.handle, v.name);
 }
 
 HostValue WINAPI ExpGetString(RunObjectData* instance, HostValue hostValue) {
-    NamedKey k = FetchNamedKey(instance, hostValue);
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!NamedKeyIsUsable(&k)) return TextResult(instance, EmptyString);
-    return ReadString(instance, RootKeyTable[k.index].handle, k.path, k.name);
+    NamedValue v = FetchNamedValue(instance, hostValue);
+    TargetKey key;
+    if (!ReachNamedValue(instance, v, &key)) return TextResult(instance, EmptyString);
+    return ReadString(instance, key.handle, v.name);
 }

@@ -3,12 +3,9 @@
 #include <wchar.h>
 
 #include "../runtime/routines.h"
-#include "registry_access.h"
+#include "key_access.h"
 
 namespace {
-
-// What to write once the key is open; returns the write's result.
-typedef LONG (*ValueWrite)(HKEY key, const WCHAR* name, HostValue value);
 
 LONG WriteDword(HKEY key, const WCHAR* name, HostValue value) {
     DWORD data = static_cast<DWORD>(value);
@@ -17,8 +14,7 @@ LONG WriteDword(HKEY key, const WCHAR* name, HostValue value) {
 }
 
 // Keeps the type of an existing REG_SZ or REG_EXPAND_SZ value; anything else becomes REG_SZ.
-LONG WriteString(HKEY key, const WCHAR* name, HostValue value) {
-    const WCHAR* text = Text(value);
+LONG WriteString(HKEY key, const WCHAR* name, const WCHAR* text) {
     DWORD type = REG_SZ, size = 0;
     RegQueryValueExW(key, name, nullptr, &type, nullptr, &size);
     if (type != REG_SZ && type != REG_EXPAND_SZ) type = REG_SZ;
@@ -27,82 +23,63 @@ LONG WriteString(HKEY key, const WCHAR* name, HostValue value) {
                           count * sizeof(WCHAR));
 }
 
-// Creates or opens the key with write access and, if given, writes one value into it.
-void CreateAndWrite(RunObjectData* instance, HKEY root, const WCHAR* path, ValueWrite write,
-                    const WCHAR* name, HostValue value) {
-    HKEY key;
-    LONG result = RegCreateKeyExW(root, path, 0, nullptr, 0, WriteAccess(instance), nullptr, &key,
-                                  nullptr);
-    instance->lastError = static_cast<DWORD>(result);
-    if (result != ERROR_SUCCESS) return;
-    if (write) instance->lastError = static_cast<DWORD>(write(key, name, value));
-    RegCloseKey(key);
-}
-
-void WriteToCurrentKey(RunObjectData* instance, ValueWrite write, const WCHAR* name,
-                       HostValue value) {
-    CreateAndWrite(instance, CurrentRoot(instance), instance->currentKey, write, name, value);
-}
-
-void WriteToRootOf(RunObjectData* instance, const RootKeyParam* param, const WCHAR* path,
-                   ValueWrite write, const WCHAR* name, HostValue value) {
-    CreateAndWrite(instance, RootKeyTable[RootIndexOf(param)].handle, path, write, name, value);
+// Records the write's result and closes the key, whatever the write gave.
+void Finish(RunObjectData* instance, const TargetKey& key, LONG written) {
+    instance->lastError = static_cast<DWORD>(written);
+    RegCloseKey(key.handle);
 }
 
 }  // namespace
 
 short WINAPI ActSetCurrentDword(RunObjectData* instance, HostValue valueName, HostValue value) {
     const WCHAR* name = Text(valueName);
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!instance->currentKey || !name || instance->rootKeyIndex >= RootKeyCount) return 0;
-    WriteToCurrentKey(instance, WriteDword, name, value);
+    TargetKey key;
+    if (ReachCurrentKey(instance, KeyUse::Write, &key, name != nullptr))
+        Finish(instance, key, WriteDword(key.handle, name, value));
     return 0;
 }
 
 short WINAPI ActSetCurrentString(RunObjectData* instance, HostValue valueName, HostValue text) {
     const WCHAR* name = Text(valueName);
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!instance->currentKey || !name || !Text(text) ||
-        instance->rootKeyIndex >= RootKeyCount)
-        return 0;
-    WriteToCurrentKey(instance, WriteString, name, text);
+    TargetKey key;
+    if (ReachCurrentKey(instance, KeyUse::Write, &key, name && Text(text)))
+        Finish(instance, key, WriteString(key.handle, name, Text(text)));
     return 0;
 }
 
 short WINAPI ActSetDword(RunObjectData* instance, HostValue, HostValue) {
-    const RootKeyParam* param = RootParam(NextParameter(instance));
-    const WCHAR* path = Text(NextParameter(instance));
+    HostValue rootKey = NextParameter(instance);
+    HostValue keyPath = NextParameter(instance);
     const WCHAR* name = Text(NextParameter(instance));
     HostValue value = NextParameter(instance);
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!param || !path || !name || RootIndexOf(param) >= RootKeyCount) return 0;
-    WriteToRootOf(instance, param, path, WriteDword, name, value);
+    TargetKey key;
+    if (ReachNamedKey(instance, KeyUse::Write, rootKey, keyPath, &key, name != nullptr))
+        Finish(instance, key, WriteDword(key.handle, name, value));
     return 0;
 }
 
 short WINAPI ActSetString(RunObjectData* instance, HostValue, HostValue) {
-    const RootKeyParam* param = RootParam(NextParameter(instance));
-    const WCHAR* path = Text(NextParameter(instance));
+    HostValue rootKey = NextParameter(instance);
+    HostValue keyPath = NextParameter(instance);
     const WCHAR* name = Text(NextParameter(instance));
-    HostValue text = NextParameter(instance);
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!param || !path || !name || !Text(text) || RootIndexOf(param) >= RootKeyCount) return 0;
-    WriteToRootOf(instance, param, path, WriteString, name, text);
+    const WCHAR* text = Text(NextParameter(instance));
+    TargetKey key;
+    if (ReachNamedKey(instance, KeyUse::Write, rootKey, keyPath, &key, name && text))
+        Finish(instance, key, WriteString(key.handle, name, text));
     return 0;
 }
 
+// Creating a key alone leaves lastError with the create's result.
 short WINAPI ActCreateCurrentKey(RunObjectData* instance, HostValue, HostValue) {
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!CurrentKeyIsUsable(instance)) return 0;
-    WriteToCurrentKey(instance, nullptr, nullptr, 0);
+    TargetKey key;
+    if (ReachCurrentKey(instance, KeyUse::Write, &key)) RegCloseKey(key.handle);
     return 0;
 }
 
 short WINAPI ActCreateKey(RunObjectData* instance, HostValue, HostValue) {
-    const RootKeyParam* param = RootParam(NextParameter(instance));
-    const WCHAR* path = Text(NextParameter(instance));
-    instance->lastError = ERR_INVALID_PARAMETERS;
-    if (!param || !path || RootIndexOf(param) >= RootKeyCount) return 0;
-    WriteToRootOf(instance, param, path, nullptr, nullptr, 0);
+    HostValue rootKey = NextParameter(instance);
+    HostValue keyPath = NextParameter(instance);
+    TargetKey key;
+    if (ReachNamedKey(instance, KeyUse::Write, rootKey, keyPath, &key)) RegCloseKey(key.handle);
     return 0;
 }

@@ -15,41 +15,65 @@ const RootKey RootKeyTable[RootKeyCount + 1] = {
 };
 #undef ROOT
 
-DWORD RootIndexOf(const RootKeyParam* param) {
-    const BYTE* b = param->rootIndex;
-    return static_cast<DWORD>(b[0]) | static_cast<DWORD>(b[1]) << 8 |
-           static_cast<DWORD>(b[2]) << 16 | static_cast<DWORD>(b[3]) << 24;
+const WCHAR* RootNameAt(DWORD index) {
+    const RootKey* root = RootKeyAt(index);
+    return root ? root->name : EmptyString;
 }
 
-// Case folding maps each character to one character, so only a name of the same length can be
-// equal: the length test spares the comparison for the other entries, and a long text is never
-// read past the longest name.
-DWORD RootKeyByName(const WCHAR* name) {
-    const size_t longest = sizeof("HKEY_CURRENT_CONFIG") - 1;
+DWORD LoadRootIndex(const BYTE* field) {
+    return static_cast<DWORD>(field[0]) | static_cast<DWORD>(field[1]) << 8 |
+           static_cast<DWORD>(field[2]) << 16 | static_cast<DWORD>(field[3]) << 24;
+}
+
+void StoreRootIndex(BYTE* field, DWORD index) {
+    for (int i = 0; i < 4; ++i) field[i] = static_cast<BYTE>(index >> (8 * i));
+}
+
+namespace {
+
+const size_t LongestRootName = sizeof("HKEY_CURRENT_CONFIG") - 1;
+
+// The characters of `name`, counted no further than one past the longest root name. Two at a
+// time, which halves the loop's turns: the count is on the path of every named-key reader, and
+// one character a turn cost a third of the whole lookup.
+size_t BoundedLength(const WCHAR* name) {
     size_t length = 0;
-    while (length <= longest && name[length]) ++length;
-    DWORD index = 0;
-    for (; RootKeyTable[index].name; ++index) {
-        if (RootKeyTable[index].length == length && _wcsicmp(name, RootKeyTable[index].name) == 0)
-            break;
+    while (length < LongestRootName && name[length] && name[length + 1]) length += 2;
+    while (length <= LongestRootName && name[length]) ++length;
+    return length;
+}
+
+// True when `name`, of `length` characters, is spelt exactly as the root's name. The last
+// characters tell apart the names of equal length, so at most one whole comparison is made.
+bool SpeltAs(const WCHAR* name, size_t length, const RootKey& root) {
+    return root.length == length && name[length - 1] == root.name[length - 1] &&
+           memcmp(name, root.name, length * sizeof(WCHAR)) == 0;
+}
+
+}  // namespace
+
+// A name spelt as the table spells it, the usual case (the editor shows the names so,
+// ExpGetCurrentRootKey gives them back so), is found without a case-insensitive comparison; it
+// cannot equal an earlier entry ignoring case, since no two names do. Any other spelling is
+// compared with _wcsicmp. Case folding maps each character to one character, so only a name of
+// the same length can be equal, and a long text is never read past the longest name.
+DWORD RootKeyByName(const WCHAR* name) {
+    size_t length = BoundedLength(name);
+    for (DWORD index = 0; index < RootKeyCount; ++index)
+        if (SpeltAs(name, length, RootKeyTable[index])) return index;
+    for (DWORD index = 0; index < RootKeyCount; ++index) {
+        const RootKey& root = RootKeyTable[index];
+        if (root.length == length && _wcsicmp(name, root.name) == 0) return index;
     }
-    return index;
+    return RootKeyCount;
 }
-
-static REGSAM WithView(const RunObjectData* instance, REGSAM access) {
-    return instance->use64BitView ? access | KEY_WOW64_64KEY : access;
-}
-
-REGSAM ReadAccess(const RunObjectData* instance) { return WithView(instance, KEY_READ); }
-
-REGSAM WriteAccess(const RunObjectData* instance) { return WithView(instance, KEY_ALL_ACCESS); }
 
 short WINAPI ActSetRootKey(RunObjectData* instance, HostValue param, HostValue) {
     instance->lastError = ERR_INVALID_PARAMETERS;
-    const auto* record = reinterpret_cast<const RootKeyParam*>(param);
+    const RootKeyParam* record = RootParam(param);
     if (!record) return 0;
     DWORD index = RootIndexOf(record);
-    if (index >= RootKeyCount) return 0;
+    if (!RootKeyAt(index)) return 0;
     instance->lastError = ERROR_SUCCESS;
     instance->rootKeyIndex = index;
     return 0;
@@ -59,7 +83,7 @@ short WINAPI ActSetRootKey(RunObjectData* instance, HostValue param, HostValue) 
 // When no copy can be had the old key stays and the failure is reported, not hidden.
 short WINAPI ActSetCurrentKey(RunObjectData* instance, HostValue param, HostValue) {
     instance->lastError = ERR_INVALID_PARAMETERS;
-    const auto* text = reinterpret_cast<const WCHAR*>(param);
+    const WCHAR* text = Text(param);
     if (!text) return 0;
     auto* copy = static_cast<WCHAR*>(calloc(wcslen(text) + 1, sizeof(WCHAR)));
     if (!copy) {
@@ -79,8 +103,7 @@ short WINAPI ActSet64BitMode(RunObjectData* instance, HostValue param, HostValue
 }
 
 HostValue WINAPI ExpGetCurrentRootKey(RunObjectData* instance, HostValue) {
-    DWORD index = instance->rootKeyIndex;
-    return TextResult(instance, index < RootKeyCount ? RootKeyTable[index].name : EmptyString);
+    return TextResult(instance, RootNameAt(instance->rootKeyIndex));
 }
 
 HostValue WINAPI ExpGetCurrentKey(RunObjectData* instance, HostValue) {

@@ -14,12 +14,20 @@ struct RootKey {
 // The five predefined roots, in index order; the names end with a null entry.
 extern const RootKey RootKeyTable[RootKeyCount + 1];
 
-// The root index stored in a RootKeyParam record (any value; callers compare it with 5).
-DWORD RootIndexOf(const RootKeyParam* param);
+// The root at `index`, or null for an index of 5 or more: a loaded saved state or a
+// RootKeyParam record may hold any value, so every use of an index goes through here.
+inline const RootKey* RootKeyAt(DWORD index) {
+    return index < RootKeyCount ? &RootKeyTable[index] : nullptr;
+}
+
+// The root's display name, or EmptyString for an invalid index.
+const WCHAR* RootNameAt(DWORD index);
+
+// The root index of a RootKeyParam record: a little-endian u32 at an odd place, read and
+// written bytewise.
+DWORD LoadRootIndex(const BYTE* field);
+void StoreRootIndex(BYTE* field, DWORD index);
+inline DWORD RootIndexOf(const RootKeyParam* param) { return LoadRootIndex(param->rootIndex); }
 
 // Index of the root whose display name equals `name` ignoring case, or RootKeyCount if none.
 DWORD RootKeyByName(const WCHAR* name);
-
-// The access masks of every registry open and create, with the instance's view added.
-REGSAM ReadAccess(const RunObjectData* instance);
-REGSAM WriteAccess(const RunObjectData* instance);

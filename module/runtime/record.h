@@ -1,6 +1,6 @@
 // The records the host and the module share at run time: the instance record, the host's run
 // header with its services, the RunObjectInfos block and the routine shapes. Byte offsets are
-// what the host reads and writes; 32-bit builds assert every one of them.
+// what the host reads and writes; every build asserts them for its pointer size.
 #pragma once
 
 #include <windows.h>
@@ -9,6 +9,12 @@
 #include <stdint.h>
 
 #include "../exports.h"
+
+// The host's offsets for this build's pointer size: the 32-bit ones are the shipped contract,
+// the 64-bit ones follow from the same rule (pointers grow to 8 bytes and align to 8).
+constexpr size_t ByPointerSize(size_t with4, size_t with8) {
+    return sizeof(void*) == 4 ? with4 : with8;
+}
 
 // Values that travel in a pointer-sized slot: parameter values, the expression host value.
 typedef INT_PTR HostValue;
@@ -85,55 +91,46 @@ typedef DWORD(WINAPI* GetHostVersionService)(void);
 typedef void(WINAPI* InsertPropertiesService)(HostValue hostValue, int one, const void* properties,
                                               int one2, int one3);
 struct EditorStructure {
-    BYTE hostOwned0[sizeof(void*) == 4 ? 20 : 24];
+    BYTE hostOwned0[ByPointerSize(20, 24)];
     HWND window;
-    BYTE hostOwned1[336 - (sizeof(void*) == 4 ? 20 : 24) - sizeof(void*)];
+    BYTE hostOwned1[336 - ByPointerSize(20, 24) - sizeof(void*)];
     GetHostVersionService getHostVersion;
     InsertPropertiesService insertProperties;
 };
 
-#if defined(_WIN64) || defined(__x86_64__)
-static_assert(offsetof(RunObjectData, rootKeyIndex) == 184, "rootKeyIndex");
-static_assert(offsetof(RunObjectData, currentKey) == 192, "currentKey");
-static_assert(offsetof(RunObjectData, lastError) == 200, "lastError");
-static_assert(offsetof(RunObjectData, use64BitView) == 204, "use64BitView");
-static_assert(sizeof(RunObjectData) == 208, "RunObjectData size");
-static_assert(offsetof(RunHeader, getFirstExpressionParameter) == 880, "first parameter");
-static_assert(offsetof(RunHeader, getNextExpressionParameter) == 888, "next parameter");
-static_assert(offsetof(EditorStructure, window) == 24, "window");
-static_assert(offsetof(EditorStructure, insertProperties) == 344, "InsertProperties");
-static_assert(offsetof(RunObjectInfos, conditionCount) == 24, "counts");
-static_assert(offsetof(RunObjectInfos, identifier) == 40, "identifier");
-#else
-static_assert(sizeof(void*) == 4, "32-bit build");
+static_assert(sizeof(void*) == 4 || sizeof(void*) == 8, "4- or 8-byte pointers");
 static_assert(offsetof(ObjectHeader, runHeader) == 8, "runHeader");
 static_assert(offsetof(ObjectHeader, headerFlags) == 124, "headerFlags");
 static_assert(sizeof(ObjectHeader) == 184, "ObjectHeader size");
 static_assert(offsetof(RunObjectData, rootKeyIndex) == 184, "rootKeyIndex");
-static_assert(offsetof(RunObjectData, currentKey) == 188, "currentKey");
-static_assert(offsetof(RunObjectData, lastError) == 192, "lastError");
-static_assert(offsetof(RunObjectData, use64BitView) == 196, "use64BitView");
-static_assert(sizeof(RunObjectData) == 200, "RunObjectData size");
+static_assert(offsetof(RunObjectData, currentKey) == ByPointerSize(188, 192), "currentKey");
+static_assert(offsetof(RunObjectData, lastError) == ByPointerSize(192, 200), "lastError");
+static_assert(offsetof(RunObjectData, use64BitView) == ByPointerSize(196, 204), "use64BitView");
+static_assert(sizeof(RunObjectData) == ByPointerSize(200, 208), "RunObjectData size");
 static_assert(offsetof(RunHeader, getStringBuffer) == 872, "GetStringBuffer");
-static_assert(offsetof(RunHeader, getFirstExpressionParameter) == 876, "first parameter");
-static_assert(offsetof(RunHeader, getNextExpressionParameter) == 880, "next parameter");
+static_assert(offsetof(RunHeader, getFirstExpressionParameter) == ByPointerSize(876, 880),
+              "first parameter");
+static_assert(offsetof(RunHeader, getNextExpressionParameter) == ByPointerSize(880, 888),
+              "next parameter");
 static_assert(offsetof(RunHeader, getNextParameter) == 928, "GetNextParameter");
-static_assert(offsetof(EditorStructure, window) == 20, "window");
+static_assert(offsetof(EditorStructure, window) == ByPointerSize(20, 24), "window");
 static_assert(offsetof(EditorStructure, getHostVersion) == 336, "GetHostVersion");
-static_assert(offsetof(EditorStructure, insertProperties) == 340, "InsertProperties");
+static_assert(offsetof(EditorStructure, insertProperties) == ByPointerSize(340, 344),
+              "InsertProperties");
 static_assert(offsetof(RunObjectInfos, conditions) == 0, "conditions");
-static_assert(offsetof(RunObjectInfos, actions) == 4, "actions");
-static_assert(offsetof(RunObjectInfos, expressions) == 8, "expressions");
-static_assert(offsetof(RunObjectInfos, conditionCount) == 12, "condition count");
-static_assert(offsetof(RunObjectInfos, actionCount) == 14, "action count");
-static_assert(offsetof(RunObjectInfos, expressionCount) == 16, "expression count");
-static_assert(offsetof(RunObjectInfos, reserved20) == 18, "u16 20");
-static_assert(offsetof(RunObjectInfos, reserved0) == 20, "u32 0");
-static_assert(offsetof(RunObjectInfos, reserved100) == 24, "u8 100");
-static_assert(offsetof(RunObjectInfos, hostByte) == 25, "host byte");
-static_assert(offsetof(RunObjectInfos, reserved0b) == 26, "u16 0");
-static_assert(offsetof(RunObjectInfos, identifier) == 28, "identifier");
-static_assert(offsetof(RunObjectInfos, reserved1) == 32, "u16 1");
-#endif
+static_assert(offsetof(RunObjectInfos, actions) == ByPointerSize(4, 8), "actions");
+static_assert(offsetof(RunObjectInfos, expressions) == ByPointerSize(8, 16), "expressions");
+static_assert(offsetof(RunObjectInfos, conditionCount) == ByPointerSize(12, 24),
+              "condition count");
+static_assert(offsetof(RunObjectInfos, actionCount) == ByPointerSize(14, 26), "action count");
+static_assert(offsetof(RunObjectInfos, expressionCount) == ByPointerSize(16, 28),
+              "expression count");
+static_assert(offsetof(RunObjectInfos, reserved20) == ByPointerSize(18, 30), "u16 20");
+static_assert(offsetof(RunObjectInfos, reserved0) == ByPointerSize(20, 32), "u32 0");
+static_assert(offsetof(RunObjectInfos, reserved100) == ByPointerSize(24, 36), "u8 100");
+static_assert(offsetof(RunObjectInfos, hostByte) == ByPointerSize(25, 37), "host byte");
+static_assert(offsetof(RunObjectInfos, reserved0b) == ByPointerSize(26, 38), "u16 0");
+static_assert(offsetof(RunObjectInfos, identifier) == ByPointerSize(28, 40), "identifier");
+static_assert(offsetof(RunObjectInfos, reserved1) == ByPointerSize(32, 44), "u16 1");
 static_assert(offsetof(RootKeyParam, rootIndex) == 6, "RootKeyParam root index");
 static_assert(sizeof(RootKeyParam) == 10, "RootKeyParam size");

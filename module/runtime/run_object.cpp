@@ -6,23 +6,29 @@
 
 namespace {
 
-const ConditionRoutine ConditionRoutines[] = {
-    CndKeyExists, CndValueExists, CndCurrentKeyExists, CndCurrentValueExists,
-    CndLastActionSuccessful, nullptr,
-};
+// Each table holds the routines of one kind at their codes, and a null entry after them.
+#define HV_ROUTINE(code, routine, parameters) routine,
+const ConditionRoutine ConditionRoutines[] = {HV_CONDITIONS(HV_ROUTINE) nullptr};
+const ActionRoutine ActionRoutines[] = {HV_ACTIONS(HV_ROUTINE) nullptr};
+const ExpressionRoutine ExpressionRoutines[] = {HV_EXPRESSIONS(HV_ROUTINE) nullptr};
+#undef HV_ROUTINE
 
-const ActionRoutine ActionRoutines[] = {
-    ActSetRootKey,       ActSetCurrentKey,      ActSetCurrentDword, ActSetCurrentString,
-    ActSetDword,         ActSetString,          ActDeleteCurrentKey, ActDeleteCurrentValue,
-    ActDeleteKey,        ActDeleteValue,        ActCreateCurrentKey, ActCreateKey,
-    ActSet64BitMode,     nullptr,
-};
+// A routine's place in its table is its code, so the list must be written in code order.
+#define HV_CODE(code, routine, parameters) code,
+constexpr int ConditionCodes[] = {HV_CONDITIONS(HV_CODE)};
+constexpr int ActionCodes[] = {HV_ACTIONS(HV_CODE)};
+constexpr int ExpressionCodes[] = {HV_EXPRESSIONS(HV_CODE)};
+#undef HV_CODE
 
-const ExpressionRoutine ExpressionRoutines[] = {
-    ExpGetCurrentRootKey, ExpGetCurrentKey, ExpGetCurrentDword, ExpGetCurrentString,
-    ExpGetDword,          ExpGetString,     ExpLastErrorCode,   ExpLastErrorMessage,
-    nullptr,
-};
+template <size_t N>
+constexpr bool InCodeOrder(const int (&codes)[N]) {
+    for (size_t i = 0; i < N; ++i)
+        if (codes[i] != static_cast<int>(i)) return false;
+    return true;
+}
+static_assert(InCodeOrder(ConditionCodes), "conditions in code order");
+static_assert(InCodeOrder(ActionCodes), "actions in code order");
+static_assert(InCodeOrder(ExpressionCodes), "expressions in code order");
 
 // The four-character code HVLT, first character in the most significant byte.
 const DWORD ObjectIdentifier = 'H' << 24 | 'V' << 16 | 'L' << 8 | 'T';
@@ -51,13 +57,9 @@ HV_EXPORT short WINAPI DestroyRunObject(RunObjectData* instance, HostValue) {
 
 HV_EXPORT short WINAPI HandleRunObject(RunObjectData*) { return 1; }
 
-// Pausing, continuing and displaying need nothing from this object: one routine answers all.
+// Pausing, continuing and displaying need nothing from this object: one routine answers all
+// three, under the names that Hivelet.def gives it.
 HV_EXPORT short WINAPI IdleRunObject(RunObjectData*) { return 0; }
-#ifndef _WIN32  // Hivelet.def gives the Windows builds the three names
-HV_EXPORT short WINAPI PauseRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
-HV_EXPORT short WINAPI ContinueRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
-HV_EXPORT short WINAPI DisplayRunObject(RunObjectData*) __attribute__((alias("IdleRunObject")));
-#endif
 
 // Writes every field of the block but the one byte that belongs to the host.
 HV_EXPORT short WINAPI GetRunObjectInfos(HostValue, RunObjectInfos* infos) {

@@ -18,9 +18,7 @@ const size_t HostLineChars = 256;
 
 // The text that an item's %s stands for.
 const WCHAR* ItemArgument(const RunObjectData* instance, WORD item) {
-    if (item == DEBUG_ITEM_ROOT_KEY)
-        return instance->rootKeyIndex < RootKeyCount ? RootKeyTable[instance->rootKeyIndex].name
-                                                     : EmptyString;
+    if (item == DEBUG_ITEM_ROOT_KEY) return RootNameAt(instance->rootKeyIndex);
     return instance->currentKey ? instance->currentKey : EmptyString;
 }
 

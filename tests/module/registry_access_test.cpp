@@ -80,5 +80,43 @@ TEST_F(RegistryRootTable, EachIndexAndEachNameInAnyCaseReachesItsOwnRoot) {
     }
 }
 
+// A root-key name selects the root whose display name it equals ignoring the case of A to Z,
+// and nothing else: names of equal length, names that end alike, prefixes and longer names.
+struct RootName {
+    const char16_t* name;
+    int root;  // the root index it selects, or -1
+};
+void PrintTo(const RootName& r, std::ostream* os) { *os << hvtest::show(r.name); }
+
+class RegistryRootNames : public RegistryFixture, public ::testing::WithParamInterface<RootName> {};
+
+TEST_P(RegistryRootNames, SelectExactlyTheirRoot) {
+    const RootName& r = GetParam();
+    put(CurrentUser, at(u"P"), u"v", REG_DWORD, {77, 0, 0, 0});
+    w32test::clearJournal();
+    auto o = expr(GetDword, {Param::str(r.name), Param::str(at(u"P")), Param::str(u"v")});
+    EXPECT_EQ(o.asInteger(), r.root == int(User) ? 77 : 0);
+    // 40: no root; 2: a root without the key.
+    EXPECT_EQ(instance.lastError(), r.root < 0 ? 40u : r.root == int(User) ? 0u : 2u);
+    if (Layer) {
+        auto opens = callsOf(w32test::journal(), "RegOpenKeyExW");
+        ASSERT_EQ(opens.size(), r.root < 0 ? 0u : 1u);
+        if (r.root >= 0) {
+            EXPECT_EQ(opens[0].args[0], handleValue(RootHandles[r.root]));
+        }
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Names, RegistryRootNames,
+    ::testing::Values(RootName{u"HKEY_CLASSES_ROOT", 0}, RootName{u"HKEY_LOCAL_MACHINE", 1},
+                      RootName{u"HKEY_CURRENT_USER", 2}, RootName{u"HKEY_CURRENT_CONFIG", 3},
+                      RootName{u"HKEY_USERS", 4}, RootName{u"Hkey_Current_User", 2},
+                      RootName{u"HKEY_CURRENT_USEr", 2}, RootName{u"hkey_classes_rooT", 0},
+                      RootName{u"HKEY_CLASSES_ROOR", -1}, RootName{u"HKEY_CURRENT_USET", -1},
+                      RootName{u"HKEY_CURRENT_USE", -1}, RootName{u"HKEY_CURRENT_USERS", -1},
+                      RootName{u"HKEY_CURRENT_CONFIGURATION_OF_THE_MACHINE", -1},
+                      RootName{u"HKEY_USER", -1}, RootName{u"HKEY_USERS_", -1}));
+
 }  // namespace
 }  // namespace hvreg

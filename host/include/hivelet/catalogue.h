@@ -49,7 +49,7 @@ class Catalogue {
 public:
     Catalogue(Module& module, Editor& editor) : module_(module), editor_(editor) {}
 
-    // Events of each kind: 5 conditions, 13 actions, 8 expressions.
+    // Events of each kind, from the module's event list: 5 conditions, 13 actions, 8 expressions.
     static int eventCount(EventKind kind);
 
     // The Menu entry point's popup; the caller destroys it. Null when the module gave none.

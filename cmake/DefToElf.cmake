@@ -1,0 +1,41 @@
+# cmake -DDEF=Hivelet.def -DEXTRA=name,name -DVERSION_SCRIPT=exports.map -DALIASES=aliases.ld
+#       -P DefToElf.cmake
+# Turns a module-definition file into what an ELF link needs to export the same names: a version
+# script that makes exactly the listed names global (and EXTRA, the names the Win32 layer looks
+# up in a module it loads), and a linker script that defines each `Name=Internal` export as
+# another name of the internal symbol.
+file(STRINGS ${DEF} lines)
+set(names "")
+set(aliases "")
+set(inExports FALSE)
+foreach(line IN LISTS lines)
+  string(REGEX REPLACE ";.*$" "" line "${line}")
+  string(STRIP "${line}" line)
+  if(line STREQUAL "")
+    continue()
+  elseif(line MATCHES "^EXPORTS$")
+    set(inExports TRUE)
+  elseif(NOT inExports)
+    continue()
+  elseif(line MATCHES "^([A-Za-z_][A-Za-z0-9_]*)(=([A-Za-z_][A-Za-z0-9_]*))?([ \t]+@[0-9]+)?$")
+    list(APPEND names ${CMAKE_MATCH_1})
+    if(CMAKE_MATCH_3)
+      string(APPEND aliases "${CMAKE_MATCH_1} = ${CMAKE_MATCH_3};\n")
+    endif()
+  else()
+    message(FATAL_ERROR "${DEF}: cannot read the export line '${line}'")
+  endif()
+endforeach()
+if(NOT names)
+  message(FATAL_ERROR "${DEF}: no exports")
+endif()
+
+string(REPLACE "," ";" extra "${EXTRA}")
+list(APPEND names ${extra})
+set(script "/* Generated from ${DEF}; do not edit. */\n{\n  global:\n")
+foreach(name IN LISTS names)
+  string(APPEND script "    ${name};\n")
+endforeach()
+string(APPEND script "  local: *;\n};\n")
+file(WRITE ${VERSION_SCRIPT} "${script}")
+file(WRITE ${ALIASES} "/* Generated from ${DEF}; do not edit. */\n${aliases}")
