@@ -116,7 +116,9 @@ INSTANTIATE_TEST_SUITE_P(
         ROW("enumerate, lpReserved", 87, enumWith(k, &gWord)),
         ROW("enumerate, NULL handle", 6, enumWith(nullptr, nullptr)),
         ROW("close NULL", 6, RegCloseKey(nullptr)),
-        ROW("close bogus", 6, RegCloseKey(kBogus)),
+        // Windows' answer is recorded nowhere; Wine answers 0 for every value from 0x80000000
+        // up in both process kinds.
+        ROW("close bogus", 0, RegCloseKey(kBogus)),
         ROW("close a predefined root", 0, RegCloseKey(kMachine)),
         ROW("close HKEY_PERFORMANCE_DATA", 0, RegCloseKey(HKEY_PERFORMANCE_DATA))));
 

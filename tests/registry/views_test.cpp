@@ -49,7 +49,8 @@ TEST_P(RegistrySharedKeys, OnlySharedKeysAreTheSameInBothViews) {
 
 INSTANTIATE_TEST_SUITE_P(
     Views, RegistrySharedKeys,
-    ::testing::Values(ViewCase{u"Classes\\P", 0}, ViewCase{u"CLIENTS\\P", 0},
+    ::testing::Values(ViewCase{u"Classes\\P", 0}, ViewCase{u"Classes\\CLSID\\P", 2},
+                      ViewCase{u"CLIENTS\\P", 0},
                       ViewCase{u"Policies\\P", 0}, ViewCase{u"RegisteredApplications", 0},
                       ViewCase{u"Microsoft\\OLE\\P", 0},
                       ViewCase{u"Microsoft\\Windows NT\\CurrentVersion\\Fonts", 0},
