@@ -47,7 +47,10 @@ INSTANTIATE_TEST_SUITE_P(
                u"The system cannot find message text for message number 0x%1 in the message "
                u"file for %2.\r\n"},
         Format{5, 18, u"Access is denied. ", unchanged, fromSystem | FORMAT_MESSAGE_MAX_WIDTH_MASK},
-        Format{5, 19, u"Access is denied.\r\n", unchanged, fromSystem | 80},  // width ignored
+        Format{5, 18, u"Access is denied. ", unchanged, fromSystem | 80},  // wider than the text
+        // Lines break at spaces within the width.
+        Format{5, 19, u"Access is\r\ndenied. ", unchanged, fromSystem | 10},
+        Format{5, 20, u"Access\r\nis\r\ndenied. ", unchanged, fromSystem | 8},
         Format{5, 19, u"Access is denied.\r\n", unchanged, FORMAT_MESSAGE_FROM_SYSTEM},
         Format{5, 19, u"Access is denied.\r\n", unchanged, fromSystem, 0x0409},
         Format{5, 19, u"Access is denied.\r\n", unchanged, fromSystem, 0x0400},  // user default

@@ -42,10 +42,11 @@ private:
     std::vector<WORD> words_;
 };
 
+// The text GetMenuStringW leaves in a buffer of `capacity` characters filled with '#'.
 std::u16string textOf(HMENU menu, UINT item, UINT flags, int capacity = 64) {
-    std::vector<char16_t> buffer(static_cast<size_t>(capacity) + 4, u'#');
-    GetMenuStringW(menu, item, reinterpret_cast<LPWSTR>(buffer.data()), capacity, flags);
-    return std::u16string(buffer.data());
+    std::u16string buffer(static_cast<size_t>(capacity), u'#');
+    GetMenuStringW(menu, item, &buffer[0], capacity, flags);
+    return buffer.c_str();
 }
 
 // One bar with a popup "File" (Open 10, separator, popup "Recent" with "One" 11, "Save" 12 greyed
@@ -92,8 +93,9 @@ TEST_F(Menus, TemplateItemsByPositionAndByCommand) {
     EXPECT_EQ(textOf(bar, 11, MF_BYCOMMAND), u"One");
     EXPECT_EQ(textOf(bar, 12, MF_BYCOMMAND), u"Save");
     EXPECT_EQ(GetMenuState(bar, 12, MF_BYCOMMAND), UINT{MF_GRAYED | MF_CHECKED});
-    // Not found: 0, the buffer emptied, the reason in the last error.
-    EXPECT_EQ(textOf(bar, 99, MF_BYCOMMAND), u"");
+    // Not found: 0, the buffer as it was, the reason in the last error (the documentation
+    // says 0 only; Wine leaves the buffer, in both process kinds).
+    EXPECT_EQ(textOf(bar, 99, MF_BYCOMMAND, 8), u"########");
     EXPECT_EQ(GetLastError(), DWORD{ERROR_MENU_ITEM_NOT_FOUND});
     EXPECT_TRUE(DestroyMenu(bar));
 }
