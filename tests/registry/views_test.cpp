@@ -1,84 +1,165 @@
-// The registry as a 32-bit process on 64-bit Windows sees it: HKLM\SOFTWARE has a 32-bit
-// copy in Wow6432Node, except the shared keys; the other roots are shared.
+// Registry views as a process sees them on 64-bit Windows: HKLM\SOFTWARE has a 32-bit copy in
+// Wow6432Node, except the shared keys; the other roots are shared. A call without a view flag
+// sees the process's own view: the 32-bit one in a 32-bit process, as the module runs and as the
+// layer models it, the 64-bit one in a 64-bit process.
 #include "registry_fixture.h"
 
 namespace {
 
 using RegistryViews = RegistryTest;
 
-TEST_F(RegistryViews, DefaultViewOfSoftwareIsWow6432Node) {
-    make(kMachine, u"Software\\Probe");  // no flag: the 32-bit view
-    EXPECT_EQ(probe(kMachine, u"SOFTWARE\\Wow6432Node\\Probe", KEY_READ | k64), 0);
-    EXPECT_EQ(probe(kMachine, u"software\\probe", KEY_READ | k32), 0);
-    EXPECT_EQ(probe(kMachine, u"Software\\Probe", KEY_READ | k64), 2);
-    HKEY software = create(kMachine, u"SOFTWARE", KEY_READ);  // SOFTWARE itself is redirected
-    EXPECT_EQ(subkeyAt(software, 0), u"Probe");
-    RegCloseKey(software);
+constexpr REGSAM kOwnView = conf::kDefaultView32 ? k32 : k64;
+constexpr REGSAM kOtherView = conf::kDefaultView32 ? k64 : k32;
+
+// Whether the key at `path` (opened with `sam`) has a subkey named `name`.
+bool hasSubkey(HKEY root, const WString& path, REGSAM sam, const WString& name) {
+    HKEY key = nullptr;
+    if (RegOpenKeyExW(root, path.c_str(), 0, sam, &key) != ERROR_SUCCESS) return false;
+    bool found = false;
+    for (DWORD i = 0; !found; ++i) {
+        WString child = subkeyAt(key, i);
+        if (child.empty()) break;
+        found = _wcsicmp(child.c_str(), name.c_str()) == 0;
+    }
+    RegCloseKey(key);
+    return found;
+}
+
+TEST_F(RegistryViews, WithoutAFlagACallSeesItsProcesssView) {
+    WString probePath = machinePath + TEXT("\\Probe");
+    make(kMachine, probePath);
+    EXPECT_EQ(probe(kMachine, probePath, KEY_READ | kOwnView), 0);
+    EXPECT_EQ(probe(kMachine, probePath, KEY_READ | kOtherView), 2);
+    // The 32-bit copy lives in Wow6432Node, which the 64-bit view shows.
+    WString below = probePath.substr(probePath.find(TEXT('\\')));
+    EXPECT_EQ(probe(kMachine, TEXT("software\\wow6432node") + below, KEY_READ | k64),
+              conf::kDefaultView32 ? 0 : 2);
+    // SOFTWARE itself is redirected: its 32-bit view is Wow6432Node.
+    for (REGSAM view : {REGSAM(0), k32, k64})
+        EXPECT_EQ(hasSubkey(kMachine, TEXT("SOFTWARE"), KEY_READ | view, TEXT("Wow6432Node")),
+                  view == k64 || (view == 0 && !conf::kDefaultView32))
+            << "view 0x" << std::hex << view;
 }
 
 TEST_F(RegistryViews, AValueWrittenInOneViewIsAbsentInTheOther) {
-    HKEY wide = create(kMachine, u"SOFTWARE\\Both", KEY_ALL_ACCESS | k64);
-    HKEY narrow = create(kMachine, u"SOFTWARE\\Both");
-    ASSERT_EQ(setDword(wide, u"bits", 64), 0);
-    EXPECT_EQ(RegQueryValueExW(narrow, u"bits", nullptr, nullptr, nullptr, nullptr), 2);
-    // RegDeleteKeyW has no view: it deletes the 32-bit copy; RegDeleteKeyExW reaches either.
-    EXPECT_EQ(RegDeleteKeyW(kMachine, u"SOFTWARE\\Both"), 0);
-    EXPECT_EQ(RegQueryValueExW(wide, u"bits", nullptr, nullptr, nullptr, nullptr), 0);
-    EXPECT_EQ(RegDeleteKeyExW(kMachine, u"SOFTWARE\\Both", k32, 0), 2);
-    EXPECT_EQ(RegDeleteKeyExW(kMachine, u"SOFTWARE\\Both", k64, 0), 0);
-    EXPECT_EQ(setDword(wide, u"bits", 64), 1018);
+    HKEY wide = create(kMachine, machinePath, KEY_ALL_ACCESS | k64);
+    HKEY narrow = create(kMachine, machinePath, KEY_ALL_ACCESS | k32);
+    ASSERT_EQ(setDword(wide, TEXT("bits"), 64), 0);
+    EXPECT_EQ(RegQueryValueExW(narrow, TEXT("bits"), nullptr, nullptr, nullptr, nullptr), 2);
+    ASSERT_EQ(setDword(narrow, TEXT("bits"), 32), 0);
+    // RegDeleteKeyW has no view flag: it deletes the process's own copy; RegDeleteKeyExW
+    // reaches either.
+    HKEY own = conf::kDefaultView32 ? narrow : wide, other = conf::kDefaultView32 ? wide : narrow;
+    EXPECT_EQ(RegDeleteKeyW(kMachine, machinePath.c_str()), 0);
+    EXPECT_EQ(RegQueryValueExW(own, TEXT("bits"), nullptr, nullptr, nullptr, nullptr), 1018);
+    EXPECT_EQ(RegQueryValueExW(other, TEXT("bits"), nullptr, nullptr, nullptr, nullptr), 0);
+    EXPECT_EQ(RegDeleteKeyExW(kMachine, machinePath.c_str(), kOwnView, 0), 2);
+    EXPECT_EQ(RegDeleteKeyExW(kMachine, machinePath.c_str(), kOtherView, 0), 0);
+    EXPECT_EQ(setDword(other, TEXT("bits"), 1), 1018);
     RegCloseKey(wide);
     RegCloseKey(narrow);
 }
 
 struct ViewCase {
-    const char16_t* below;  // path below HKLM\SOFTWARE, created in the 32-bit view
-    LONG seenFrom64;
+    const WCHAR* parent;  // below HKLM\SOFTWARE; the row's key is created there in the 32-bit view
+    const WCHAR* leaf;    // its name, or null for the test's own name
+    LONG seenFrom64;      // 0: shared, 2: redirected
+    const char* wineDiffers = nullptr;
 };
 void PrintTo(const ViewCase& c, std::ostream* os) {
-    *os << ::testing::PrintToString(std::u16string(c.below));
+    WString leaf = c.leaf ? c.leaf : TEXT("<test>");
+    *os << ::testing::PrintToString(WString(c.parent) + TEXT("\\") + leaf);
 }
 
 class RegistrySharedKeys : public RegistryTest, public ::testing::WithParamInterface<ViewCase> {};
 
 TEST_P(RegistrySharedKeys, OnlySharedKeysAreTheSameInBothViews) {
-    std::u16string path = std::u16string(u"SOFTWARE\\") + GetParam().below;
-    make(kMachine, path);
-    EXPECT_EQ(probe(kMachine, path.c_str(), KEY_READ | k64), GetParam().seenFrom64);
+    const ViewCase& c = GetParam();
+    if (c.wineDiffers) HV_WINE_DIFFERS(c.wineDiffers);
+    WString path = TEXT("SOFTWARE\\") + WString(c.parent);
+    path += (c.parent[0] ? TEXT("\\") : TEXT("")) + (c.leaf ? c.leaf : id);
+    for (REGSAM view : {k32, k64}) own(kMachine, path, view);
+    make(kMachine, path, KEY_ALL_ACCESS | k32);
+    EXPECT_EQ(probe(kMachine, path, KEY_READ | k64), c.seenFrom64);
 }
+
+// Wine shares keys through links from Wow6432Node, made from a list of its own.
+const char kWineLinksMicrosoftClients[] = "its shared Clients is SOFTWARE\\Microsoft\\Clients";
+const char kWineHasNoLink[] = "RegisteredApplications is not among its shared keys";
+// In a 64-bit process Wine puts a key made below Classes with KEY_WOW64_32KEY into
+// Classes\Wow6432Node, where the 64-bit view does not see it; in a 32-bit process it does not.
+const char* const kWineRedirectsClasses =
+    sizeof(void*) == 8 ? "a 64-bit process's KEY_WOW64_32KEY keys below Classes are a copy"
+                       : nullptr;
 
 INSTANTIATE_TEST_SUITE_P(
     Views, RegistrySharedKeys,
-    ::testing::Values(ViewCase{u"Classes\\P", 0}, ViewCase{u"CLIENTS\\P", 0},
-                      ViewCase{u"Policies\\P", 0}, ViewCase{u"RegisteredApplications", 0},
-                      ViewCase{u"Microsoft\\OLE\\P", 0},
-                      ViewCase{u"Microsoft\\Windows NT\\CurrentVersion\\Fonts", 0},
-                      ViewCase{u"Microsoft\\Windows\\CurrentVersion\\App Paths\\P", 0},
-                      ViewCase{u"Microsoft\\Windows\\CurrentVersion\\Run", 2},
-                      ViewCase{u"Microsoft\\OLEX", 2}, ViewCase{u"ClassesX", 2}));
+    ::testing::Values(
+        ViewCase{TEXT("Classes"), nullptr, 0, kWineRedirectsClasses},
+        ViewCase{TEXT("Classes\\CLSID"), nullptr, 2},
+        ViewCase{TEXT("Clients"), nullptr, 0, kWineLinksMicrosoftClients},
+        ViewCase{TEXT("Policies"), nullptr, 0},
+        ViewCase{TEXT("RegisteredApplications"), nullptr, 0, kWineHasNoLink},
+        ViewCase{TEXT("Microsoft\\OLE"), nullptr, 0},
+        ViewCase{TEXT("Microsoft\\Windows NT\\CurrentVersion\\Fonts"), nullptr, 0},
+        ViewCase{TEXT("Microsoft\\Windows\\CurrentVersion\\App Paths"), nullptr, 0},
+        ViewCase{TEXT("Microsoft\\Windows\\CurrentVersion\\Run"), nullptr, 2},
+        ViewCase{TEXT("Microsoft"), TEXT("OLE Hivelet"), 2},  // shared is OLE, not a prefix
+        ViewCase{TEXT(""), TEXT("Classes Hivelet"), 2}));
 
+// A handle stands for one copy; paths below it are redirected by the flag of each call.
 TEST_F(RegistryViews, WalksFromAHandleUseTheFlagOfTheCall) {
-    make(kMachine, u"SOFTWARE\\Microsoft\\OLE\\Shared", KEY_ALL_ACCESS | k64);
-    HKEY microsoft32 = create(kMachine, u"SOFTWARE\\Microsoft", KEY_READ);
-    EXPECT_EQ(probe(microsoft32, u"OLE\\Shared"), 0);  // a 32-bit handle reaches shared keys
-    make(microsoft32, u"Mine");
-    EXPECT_EQ(probe(microsoft32, u"Mine", KEY_READ | k64), 0);  // and stays in the 32-bit copy
+    if (!conf::kDefaultView32) GTEST_SKIP() << "about a 32-bit process's calls without a flag";
+    HV_WINE_DIFFERS("a path below a KEY_WOW64_64KEY handle stays 64-bit without the flag");
+    WString shared = TEXT("SOFTWARE\\Microsoft\\OLE\\") + id;
+    WString mine = TEXT("SOFTWARE\\Microsoft\\") + id;
+    for (REGSAM view : {k32, k64}) {
+        own(kMachine, shared, view);
+        own(kMachine, mine, view);
+    }
+    make(kMachine, shared, KEY_ALL_ACCESS | k64);
+    HKEY microsoft32 = create(kMachine, TEXT("SOFTWARE\\Microsoft"), KEY_READ);
+    EXPECT_EQ(probe(microsoft32, TEXT("OLE\\") + id), 0);  // a 32-bit handle reaches shared keys
+    make(microsoft32, id);  // and stays in the 32-bit copy, whatever flag a later call has
+    EXPECT_EQ(probe(microsoft32, id, KEY_READ | k64), 0);
+    EXPECT_EQ(probe(kMachine, mine, KEY_READ | k64), 2);
     RegCloseKey(microsoft32);
     // Children of a 64-bit handle need the flag again, or they are redirected.
-    HKEY software64 = create(kMachine, u"SOFTWARE", KEY_READ | k64);
-    EXPECT_EQ(probe(software64, u"Microsoft\\Mine"), 0);
-    EXPECT_EQ(probe(software64, u"Microsoft\\Mine", KEY_READ | k64), 2);
+    HKEY software64 = create(kMachine, TEXT("SOFTWARE"), KEY_READ | k64);
+    EXPECT_EQ(probe(software64, TEXT("Microsoft\\") + id), 0);
+    EXPECT_EQ(probe(software64, TEXT("Microsoft\\") + id, KEY_READ | k64), 2);
     RegCloseKey(software64);
 }
 
-TEST_F(RegistryViews, OtherRootsAreShared) {
-    for (HKEY root : {kUser, HKEY_CLASSES_ROOT, HKEY_USERS, HKEY_CURRENT_CONFIG, kMachine}) {
-        make(root, u"System\\Probe", KEY_ALL_ACCESS | k32);
-        EXPECT_EQ(probe(root, u"System\\Probe", KEY_READ | k64), 0);
-    }
-    make(kUser, u"Software\\Probe", KEY_ALL_ACCESS | k32);
-    EXPECT_EQ(probe(kUser, u"Software\\Probe", KEY_READ | k64), 0);
-    EXPECT_EQ(probe(kUser, u"Software\\Wow6432Node"), 2);
+struct RootCase {
+    HKEY root;
+    const WCHAR* parent;  // the row's key is created there, in the 32-bit view
+    const char* wineDiffers = nullptr;
+};
+void PrintTo(const RootCase& c, std::ostream* os) {
+    *os << std::hex << reinterpret_cast<uintptr_t>(c.root) << " "
+        << ::testing::PrintToString(WString(c.parent));
 }
+
+class RegistrySharedRoots : public RegistryTest, public ::testing::WithParamInterface<RootCase> {};
+
+// Nothing outside HKLM\SOFTWARE has a 32-bit copy, HKEY_CLASSES_ROOT's own keys included.
+TEST_P(RegistrySharedRoots, KeysAreTheSameInBothViews) {
+    const RootCase& c = GetParam();
+    if (c.wineDiffers) HV_WINE_DIFFERS(c.wineDiffers);
+    WString parent = c.parent[0] ? WString(c.parent) + TEXT("\\") : WString();
+    for (REGSAM view : {k32, k64}) own(c.root, parent + id, view);
+    make(c.root, parent + id, KEY_ALL_ACCESS | k32);
+    EXPECT_EQ(probe(c.root, parent + id, KEY_READ | k64), 0);
+    EXPECT_EQ(probe(c.root, parent + TEXT("Wow6432Node\\") + id, KEY_READ | k64), 2);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Roots, RegistrySharedRoots,
+    ::testing::Values(RootCase{kUser, TEXT("Software")},
+                      RootCase{HKEY_CLASSES_ROOT, TEXT(""), kWineRedirectsClasses},
+                      RootCase{HKEY_USERS, TEXT(".DEFAULT\\Software")},
+                      RootCase{HKEY_CURRENT_CONFIG, TEXT("Software")},
+                      RootCase{kMachine, TEXT("SYSTEM")}));
 
 }  // namespace

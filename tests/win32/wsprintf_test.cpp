@@ -9,32 +9,36 @@ namespace {
 
 // Formats into a patterned buffer; the result must equal the text's length.
 template <typename... Args>
-std::u16string formatted(const char16_t* format, Args... args) {
+WString formatted(const WCHAR* format, Args... args) {
     PatternBuffer out;
     int n = wsprintfW(out.data(), format, args...);
-    std::u16string text(out.data());
+    WString text(out.data());
     EXPECT_EQ(static_cast<size_t>(n), text.size()) << "for the format of " << text.size();
     return text;
 }
 
 TEST(Wsprintf, Conversions) {
-    const char16_t* none = nullptr;
+    const WCHAR* none = nullptr;
     const struct {
-        std::function<std::u16string()> run;
-        const char16_t* wanted;
+        std::function<WString()> run;
+        const WCHAR* wanted;
     } rows[] = {
-        {[&] { return formatted(u"Key = %s", none); }, u"Key = (null)"},
-        {[] { return formatted(u"Key = %s", u""); }, u"Key = "},
-        {[] { return formatted(u"%s|%ls", u"ab", u"cd"); }, u"ab|cd"},
-        {[] { return formatted(u"%hs", "narrow"); }, u"narrow"},
-        {[] { return formatted(u"%d %u", INT_MIN, 0xFFFFFFFFu); }, u"-2147483648 4294967295"},
-        {[] { return formatted(u"%x %X %08X", 0xabc, 0xabc, 0xabc); }, u"abc ABC 00000ABC"},
-        {[] { return formatted(u"%lu %ld", 4000000000u, -5); }, u"4000000000 -5"},
-        {[] { return formatted(u"%c%%", u'Q'); }, u"Q%"},
-        {[] { return formatted(u"[%5s][%-5s][%.3s]", u"ab", u"ab", u"abcdef"); },
-         u"[   ab][ab   ][abc]"},
-        {[] { return formatted(u"%yz"); }, u"yz"},
-        {[] { return formatted(u"100%"); }, u"100"},
+        {[&] { return formatted(TEXT("Key = %s"), none); }, TEXT("Key = (null)")},
+        {[] { return formatted(TEXT("Key = %s"), TEXT("")); }, TEXT("Key = ")},
+        {[] { return formatted(TEXT("%s|%ls"), TEXT("ab"), TEXT("cd")); }, TEXT("ab|cd")},
+        {[] { return formatted(TEXT("%hs"), "narrow"); }, TEXT("narrow")},
+        {[] { return formatted(TEXT("%d %u"), INT_MIN, 0xFFFFFFFFu); },
+         TEXT("-2147483648 4294967295")},
+        {[] { return formatted(TEXT("%x %X %08X"), 0xabc, 0xabc, 0xabc); },
+         TEXT("abc ABC 00000ABC")},
+        {[] { return formatted(TEXT("%lu %ld"), 4000000000u, -5); }, TEXT("4000000000 -5")},
+        {[] { return formatted(TEXT("%c%%"), TEXT('Q')); }, TEXT("Q%")},
+        {[] {
+             return formatted(TEXT("[%5s][%-5s][%.3s]"), TEXT("ab"), TEXT("ab"), TEXT("abcdef"));
+         },
+         TEXT("[   ab][ab   ][abc]")},
+        {[] { return formatted(TEXT("%yz")); }, TEXT("yz")},
+        {[] { return formatted(TEXT("100%")); }, TEXT("100")},
     };
     for (size_t i = 0; i < sizeof rows / sizeof rows[0]; ++i) {
         SCOPED_TRACE(i);
@@ -43,7 +47,8 @@ TEST(Wsprintf, Conversions) {
 }
 
 // Output stops at 1023 characters and the terminator; nothing is written at [1024]. From 1023
-// characters on the result is 1024.
+// characters on the result is 1024. The documentation gives the limit as 1,024 bytes and no
+// result at it; these are Wine's answers, the same in 32- and 64-bit processes.
 TEST(Wsprintf, LimitOf1024Characters) {
     const struct {
         size_t length;
@@ -51,12 +56,12 @@ TEST(Wsprintf, LimitOf1024Characters) {
     } rows[] = {{1021, 1021}, {1022, 1022}, {1023, 1024}, {1024, 1024}, {1030, 1024}, {2999, 1024}};
     for (const auto& row : rows) {
         SCOPED_TRACE(row.length);
-        std::u16string text(row.length, u'x');
+        WString text(row.length, TEXT('x'));
         PatternBuffer out;
         out.chars.resize(3100, PatternBuffer::pattern);
-        EXPECT_EQ(wsprintfW(out.data(), u"%s", text.c_str()), row.result);
+        EXPECT_EQ(wsprintfW(out.data(), TEXT("%s"), text.c_str()), row.result);
         size_t kept = std::min<size_t>(row.length, 1023);
-        EXPECT_EQ(std::u16string(out.data()).size(), kept);
+        EXPECT_EQ(WString(out.data()).size(), kept);
         for (size_t i = kept + 1; i < out.chars.size(); ++i)
             ASSERT_EQ(out.chars[i], PatternBuffer::pattern) << "at " << i;
     }

@@ -40,6 +40,8 @@ struct Window {
     std::vector<std::u16string> items;  // list box
     int selection = LB_ERR;             // list box
     bool ended = false;                 // dialog
+    bool shown = false;                 // dialog, once its procedure has been initialised
+    int defaultId = 0;                  // dialog: the default button DM_GETDEFID names
     INT_PTR endResult = 0;              // dialog
     std::vector<HWND> children;         // dialog, in template order
 };
@@ -192,8 +194,10 @@ LRESULT listBoxMessage(Window& w, UINT message, WPARAM wParam, LPARAM lParam) {
             return count - 1;
         case LB_RESETCONTENT: w.items.clear(); w.selection = LB_ERR; return 0;
         case LB_SETCURSEL:
-            // -1 clears the selection and, like any index out of range, answers LB_ERR.
-            w.selection = index >= 0 && index < count ? index : LB_ERR;
+            // -1 clears the selection and answers LB_ERR; another index out of range changes
+            // nothing (as in Wine, in both process kinds; the documentation does not say).
+            if (index >= count || index < -1) return LB_ERR;
+            w.selection = index >= 0 ? index : LB_ERR;
             return w.selection;
         case LB_GETCURSEL: return w.selection;
         case LB_GETCOUNT: return count;
@@ -237,12 +241,34 @@ HWND childWithId(const Window& dialog, int id) {
 
 // The default push button's identifier, as DM_GETDEFID answers it when the procedure does not.
 LRESULT defaultButton(const Window& dialog) {
+    return dialog.defaultId ? MAKELONG(dialog.defaultId, DC_HASDEFID) : 0;
+}
+
+bool isPushButton(const Window* w) {
+    DWORD type = w ? w->style & BS_TYPEMASK : ~0u;
+    return w && w->kind == Kind::Button && (type == BS_PUSHBUTTON || type == BS_DEFPUSHBUTTON);
+}
+
+// The dialog manager moves the focus: a push button that gets it looks like the default one,
+// any other control gives that look back to the dialog's default button. A plain SetFocus
+// does not do this, so Enter on a button focused that way still clicks the default button.
+void moveDefault(Window& dialog, HWND focused) {
+    const Window* f = find(focused);
+    int id = isPushButton(f) ? f->id : dialog.defaultId;
     for (HWND child : dialog.children) {
-        const Window& c = *find(child);
-        if (c.kind == Kind::Button && (c.style & BS_TYPEMASK) == BS_DEFPUSHBUTTON)
-            return MAKELONG(c.id, DC_HASDEFID);
+        Window& c = *find(child);
+        if (!isPushButton(&c)) continue;
+        c.style = (c.style & ~BS_TYPEMASK) | (c.id == id ? BS_DEFPUSHBUTTON : BS_PUSHBUTTON);
     }
-    return 0;
+}
+
+// Gives `to` the thread's keyboard focus; a list box that loses or gets it tells its dialog.
+void changeFocus(DWORD thread, HWND to) {
+    HWND from = state().focus[thread];
+    if (from == to) return;
+    state().focus[thread] = to;
+    if (Window* w = find(from); w && w->kind == Kind::ListBox) notifyParent(*w, LBN_KILLFOCUS);
+    if (Window* w = find(to); w && w->kind == Kind::ListBox) notifyParent(*w, LBN_SETFOCUS);
 }
 
 void postMessage(HWND window, UINT message, WPARAM wParam, LPARAM lParam) {
@@ -311,7 +337,8 @@ bool dialogKey(Window& dialog, const Message& m) {
     Window* f = find(focused);
     if (m.wParam == VK_RETURN) {
         int id = IDOK;
-        if (f && f->parent == dialog.handle && f->kind == Kind::Button) {
+        if (isPushButton(f) && f->parent == dialog.handle &&
+            (f->style & BS_TYPEMASK) == BS_DEFPUSHBUTTON) {
             id = f->id;
         } else if (LRESULT def = dispatch(dialog.handle, DM_GETDEFID, 0, 0);
                    HIWORD(def) == DC_HASDEFID) {
@@ -332,7 +359,9 @@ bool dialogKey(Window& dialog, const Message& m) {
             if ((find(child)->style & (WS_TABSTOP | WS_DISABLED)) == WS_TABSTOP) stops.push_back(child);
         if (stops.empty()) return true;
         auto at = std::find(stops.begin(), stops.end(), focused);
-        state().focus[m.thread] = at == stops.end() || at + 1 == stops.end() ? stops[0] : *(at + 1);
+        HWND next = at == stops.end() || at + 1 == stops.end() ? stops[0] : *(at + 1);
+        changeFocus(m.thread, next);
+        moveDefault(dialog, next);
         return true;
     }
     return false;
@@ -379,7 +408,10 @@ void destroyWindow(HWND handle) {
     State& s = state();
     Window* w = find(handle);
     if (!w) return;
-    if (w->kind == Kind::Dialog) dispatch(handle, WM_DESTROY, 0, 0);
+    if (w->kind == Kind::Dialog) {
+        if (dialogOf(s.focus[w->thread]) == w) changeFocus(w->thread, nullptr);
+        dispatch(handle, WM_DESTROY, 0, 0);
+    }
     for (HWND child : std::vector<HWND>(w->children)) destroyWindow(child);
     eraseIf(s.timers, [&](const Timer& t) { return t.window == handle; });
     eraseIf(s.topLevel, [&](HWND h) { return h == handle; });
@@ -403,6 +435,9 @@ Window* buildDialog(const w32::DialogTemplate& t, HWND owner, DLGPROC proc) {
         control->style = item.style;
         control->id = item.id;
         control->text = item.title.isOrdinal ? u"" : item.title.text;
+        if (kind == Kind::Button && (item.style & BS_TYPEMASK) == BS_DEFPUSHBUTTON &&
+            !dialog->defaultId)
+            dialog->defaultId = item.id;
         dialog->children.push_back(control->handle);
     }
     state().topLevel.push_back(dialog->handle);
@@ -444,7 +479,9 @@ INT_PTR dialogBox(HINSTANCE instance, LPCWSTR name, HWND owner, DLGPROC proc, LP
         SetLastError(static_cast<DWORD>(*code));
         return -1;
     }
-    if (owner && !findOrFail(owner)) return -1;
+    // "If the function fails because the hWndParent parameter is invalid, the return value is
+    // zero", for compatibility with earlier versions; other failures are -1.
+    if (owner && !findOrFail(owner)) return 0;
     const BYTE* data = nullptr;
     size_t size = 0;
     if (!IS_INTRESOURCE(name)) {
@@ -463,8 +500,16 @@ INT_PTR dialogBox(HINSTANCE instance, LPCWSTR name, HWND owner, DLGPROC proc, LP
     Window* dialog = buildDialog(t, owner, proc);
     HWND handle = dialog->handle;
     HWND first = firstTabStop(*dialog);
-    if (dispatch(handle, WM_INITDIALOG, reinterpret_cast<WPARAM>(first), param) && find(handle))
-        state().focus[currentThread()] = first;
+    bool focusFirst = dispatch(handle, WM_INITDIALOG, reinterpret_cast<WPARAM>(first), param);
+    // Shown after its initialisation, the dialog is active; the focus goes to the first tab
+    // stop unless the procedure returned FALSE and put it on a control of its own.
+    if (Window* shown = find(handle)) {
+        shown->shown = true;
+        if (focusFirst || dialogOf(GetFocus()) != shown) {
+            changeFocus(currentThread(), first);
+            moveDefault(*shown, first);
+        }
+    }
     INT_PTR result = modalLoop(handle);
     destroyWindow(handle);
     return result;
@@ -609,15 +654,15 @@ HWND WINAPI GetFocus(void) {
 HWND WINAPI SetFocus(HWND window) {
     HWND previous = GetFocus();
     if (window && !findOrFail(window)) return nullptr;
-    state().focus[currentThread()] = window;
+    changeFocus(currentThread(), window);
     return previous;
 }
 
-// The thread's most recent dialog stands in for the active and the foreground window.
+// The thread's most recent dialog on show stands in for the active and the foreground window.
 HWND WINAPI GetActiveWindow(void) {
     const auto& top = state().topLevel;
     for (auto it = top.rbegin(); it != top.rend(); ++it)
-        if (find(*it)->thread == currentThread()) return *it;
+        if (find(*it)->thread == currentThread() && find(*it)->shown) return *it;
     return nullptr;
 }
 

@@ -210,8 +210,9 @@ BOOL appendMenu(HMENU handle, UINT flags, UINT_PTR idNewItem, LPCWSTR text) {
     return TRUE;
 }
 
+// An item that is not there leaves the buffer as it was (Wine, in both process kinds; the
+// documentation does not say); an item without a text empties it.
 int menuString(HMENU handle, UINT item, LPWSTR buffer, int bufferMax, UINT flags) {
-    if (buffer && bufferMax > 0) buffer[0] = 0;
     Menus& m = menus();
     Guard guard(m.lock);
     Menu* menu = find(m, handle);
@@ -219,6 +220,7 @@ int menuString(HMENU handle, UINT item, LPWSTR buffer, int bufferMax, UINT flags
     Menu* holder = nullptr;
     Item* found = locate(m, *menu, item, flags, &holder);
     if (!found) return failWith(ERROR_MENU_ITEM_NOT_FOUND, 0);
+    if (buffer && bufferMax > 0) buffer[0] = 0;
     if (!found->hasText) return 0;
     int length = static_cast<int>(found->text.size());
     if (!buffer || bufferMax <= 0) return length;

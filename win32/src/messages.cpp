@@ -2,7 +2,9 @@
 // registry functions, the module and this layer produce.
 #include "internal.h"
 
+#include <algorithm>
 #include <string>
+#include <string_view>
 
 namespace {
 
@@ -85,11 +87,22 @@ bool hasInserts(const char16_t* text) {
     return false;
 }
 
-// The message as stored, ending in CR LF; a width of 0xFF turns that line break into a space.
+// The message as stored, ending in CR LF. A maximum width turns that line break into a space
+// and breaks the lines at spaces so that none is longer than the width; 0xFF sets no width.
 std::u16string messageText(const char16_t* text, DWORD flags) {
-    std::u16string out(text);
-    out += (flags & FORMAT_MESSAGE_MAX_WIDTH_MASK) == lineBreaksDropped ? u" " : u"\r\n";
-    return out;
+    DWORD width = flags & FORMAT_MESSAGE_MAX_WIDTH_MASK;
+    if (width == 0) return std::u16string(text) + u"\r\n";
+    std::u16string out;
+    size_t line = 0;  // characters on the output line so far
+    for (std::u16string_view rest = text; !rest.empty();) {
+        std::u16string_view word = rest.substr(0, rest.find(u' '));
+        rest.remove_prefix(std::min(rest.size(), word.size() + 1));
+        bool wrap = line > 0 && width != lineBreaksDropped && line + 1 + word.size() > width;
+        out += line == 0 ? u"" : wrap ? u"\r\n" : u" ";
+        line = (wrap ? 0 : line + (line > 0)) + word.size();
+        out += word;
+    }
+    return out + u" ";
 }
 
 // Fails the call with `code`; returns FormatMessageW's failure result.

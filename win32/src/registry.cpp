@@ -69,7 +69,8 @@ LONG openKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam, HKEY* out)
 
 LONG createKey(Registry& r, HKEY parent, const WCHAR* path, DWORD reserved, REGSAM sam,
                HKEY* out, DWORD* disposition) {
-    // A NULL out pointer is 87 here as for RegOpenKeyExW (Windows' answer not recorded).
+    // A NULL out pointer: Windows' answer is recorded nowhere and Wine crashes (both process
+    // kinds); 87, as RegOpenKeyExW answers.
     if (!out || reserved || bothViews(sam)) return ERROR_INVALID_PARAMETER;
     Bound start;
     if (LONG code = bind(r, parent, start)) return code;
@@ -82,7 +83,7 @@ LONG createKey(Registry& r, HKEY parent, const WCHAR* path, DWORD reserved, REGS
     bool created = false;
     if (LONG code = createPath(*way.from, way.names, key, created)) return code;
     if (LONG code = grant(r, *key, sam, out)) return code;
-    // For "" Windows' disposition is not recorded; the key existed, so it is 2.
+    // "" or NULL opens the key itself, which existed: 2 by the documented meaning (Wine: 1).
     if (disposition) *disposition = created ? REG_CREATED_NEW_KEY : REG_OPENED_EXISTING_KEY;
     return ERROR_SUCCESS;
 }
@@ -99,11 +100,12 @@ LONG deleteKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam) {
     return key ? removeKey(*key) : ERROR_FILE_NOT_FOUND;
 }
 
+bool isText(DWORD type) { return type == REG_SZ || type == REG_EXPAND_SZ || type == REG_MULTI_SZ; }
+
 // Windows adds the terminator a string value's size left out when the caller's next character
 // is one; it reads that character past cbData, as Windows does.
 DWORD storedSize(DWORD type, const BYTE* data, DWORD size) {
-    bool text = type == REG_SZ || type == REG_EXPAND_SZ || type == REG_MULTI_SZ;
-    if (!text || size < sizeof(WCHAR) || size % sizeof(WCHAR) != 0) return size;
+    if (!isText(type) || size < sizeof(WCHAR) || size % sizeof(WCHAR) != 0) return size;
     WCHAR last = 0, next = 0;
     std::memcpy(&last, data + size - sizeof(WCHAR), sizeof(WCHAR));
     if (last == 0) return size;
@@ -130,6 +132,16 @@ LONG setValue(Registry& r, HKEY handle, const WCHAR* name, DWORD type, const BYT
     return ERROR_SUCCESS;
 }
 
+// String data that does not end in a zero character gets one when two bytes of the buffer are
+// left: Wine does so in both process kinds, as its comments say NT does (and as Wine's tests
+// assert for RegQueryValueExA on Windows). The size reported stays the data's.
+void terminate(const Value& value, BYTE* data, DWORD capacity) {
+    size_t n = value.data.size();
+    if (!isText(value.type) || capacity - n < sizeof(WCHAR)) return;
+    if (value.data[n - 1] == 0 && (n == 1 || value.data[n - 2] == 0)) return;
+    data[n] = data[n + 1] = 0;
+}
+
 LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* reserved, DWORD* type,
                 BYTE* data, DWORD* size) {
     if (reserved || (data && !size)) return ERROR_INVALID_PARAMETER;
@@ -146,7 +158,10 @@ LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* reserved, DW
     if (!size) return ERROR_SUCCESS;
     // A buffer too small is not written at all: only the size it would need is reported.
     LONG code = (data && *size < needed) ? ERROR_MORE_DATA : ERROR_SUCCESS;
-    if (data && code == ERROR_SUCCESS && needed) std::memcpy(data, value.data.data(), needed);
+    if (data && code == ERROR_SUCCESS && needed) {
+        std::memcpy(data, value.data.data(), needed);
+        terminate(value, data, *size);
+    }
     *size = needed;
     return code;
 }
@@ -173,7 +188,7 @@ LONG emptyClass(WCHAR* cls, DWORD* length) {
 
 LONG enumKey(Registry& r, HKEY handle, DWORD index, WCHAR* name, DWORD* length, DWORD* reserved,
              WCHAR* cls, DWORD* classLength, FILETIME* written) {
-    // NULL name or length: Wine crashes, Windows' answer is not recorded; 87 here.
+    // NULL name or length: Windows' answer is recorded nowhere and Wine crashes; 87 here.
     if (reserved || !name || !length) return ERROR_INVALID_PARAMETER;
     Bound at;
     if (LONG code = bindFor(r, handle, KEY_ENUMERATE_SUB_KEYS, at)) return code;
@@ -194,9 +209,9 @@ LONG enumKey(Registry& r, HKEY handle, DWORD index, WCHAR* name, DWORD* length, 
 
 LONG closeKey(Registry& r, HKEY handle) {
     if (!handle) return ERROR_INVALID_HANDLE;
-    // Windows never closes predefined values, defined or not (0x8000000n); a bogus value is
-    // an invalid handle (Wine answers 0 for those, Windows' answer is not recorded).
-    if (isPredefined(handle)) return ERROR_SUCCESS;
+    // Windows never closes predefined values, defined or not (0x8000000n). For other values
+    // from 0x80000000 up its answer is recorded nowhere; Wine's is 0 in both process kinds.
+    if (reinterpret_cast<uintptr_t>(handle) >= 0x80000000u) return ERROR_SUCCESS;
     bool open = r.handles.erase(reinterpret_cast<uintptr_t>(handle)) != 0;
     return open ? ERROR_SUCCESS : ERROR_INVALID_HANDLE;
 }

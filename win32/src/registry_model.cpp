@@ -28,15 +28,29 @@ const CaseRange kCaseRanges[] = {
     {0x1EA1, 0x1EFF, -1, true},   {0xFF41, 0xFF5A, -32, false},
 };
 
-// Upper case of one UTF-16 unit, the form in which the registry compares and orders names.
-// Windows folds with its own up-case table, not ASCII only (a key made as "Été" opens as "éTÉ");
-// the simple mappings of these alphabets stand in for it.
+// Upper case of one UTF-16 unit, the form in which the registry compares names. Windows folds
+// with its own up-case table, not ASCII only (a key made as "Été" opens as "éTÉ"); the simple
+// mappings of these alphabets stand in for it.
 char16_t upcase(char16_t c) {
     if (c < 0x80) return (c >= u'a' && c <= u'z') ? static_cast<char16_t>(c - 32) : c;
     for (const CaseRange& r : kCaseRanges) {
         if (c < r.first || c > r.last) continue;
         if (r.alternating && (c - r.first) % 2 != 0) return c;
         return static_cast<char16_t>(c + r.delta);
+    }
+    return c;
+}
+
+// One unit of a name's folded form: the lower case of its upper case. Names that are equal in
+// upper case stay equal, and siblings sort as their lower case, so that '_' comes before the
+// letters: the order Wine enumerates in, in 32- and 64-bit processes. Windows promises no order.
+char16_t foldUnit(char16_t c) {
+    c = upcase(c);
+    if (c < 0x80) return (c >= u'A' && c <= u'Z') ? static_cast<char16_t>(c + 32) : c;
+    for (const CaseRange& r : kCaseRanges) {
+        int lower = c - r.delta;
+        if (lower >= r.first && lower <= r.last && upcase(static_cast<char16_t>(lower)) == c)
+            return static_cast<char16_t>(lower);
     }
     return c;
 }
@@ -109,25 +123,35 @@ Names splitTrusted(std::u16string_view path) {
     return out;
 }
 
-const std::vector<Names>& sharedTable() {
-    static const std::vector<Names>* table = [] {
-        auto* t = new std::vector<Names>;
-        for (const char16_t* path : kSharedBelowSoftware) t->push_back(splitTrusted(path));
-        return t;
-    }();
-    return *table;
+// Keys below the shared Classes key that have a 32-bit copy all the same (Windows 7 and later).
+const char16_t* const kRedirectedInShared[] = {
+    u"Classes\\CLSID",      u"Classes\\DirectShow",      u"Classes\\Interface",
+    u"Classes\\Media Type", u"Classes\\MediaFoundation",
+};
+
+template <size_t n>
+std::vector<Names>* splitAll(const char16_t* const (&paths)[n]) {
+    auto* table = new std::vector<Names>;
+    for (const char16_t* path : paths) table->push_back(splitTrusted(path));
+    return table;
+}
+
+// Whether `path` lies in one of the keys of `table`.
+bool inAny(const std::vector<Names>& table, const Names& path) {
+    for (const Names& entry : table) {
+        if (entry.size() > path.size()) continue;
+        bool match = true;
+        for (size_t i = 0; match && i < entry.size(); ++i) match = sameName(entry[i], path[i]);
+        if (match) return true;
+    }
+    return false;
 }
 
 // Whether a path below HKLM\SOFTWARE lies in one of the shared keys.
 bool isShared(const Names& belowSoftware) {
-    for (const Names& entry : sharedTable()) {
-        if (entry.size() > belowSoftware.size()) continue;
-        bool match = true;
-        for (size_t i = 0; match && i < entry.size(); ++i)
-            match = sameName(entry[i], belowSoftware[i]);
-        if (match) return true;
-    }
-    return false;
+    static const std::vector<Names>* shared = splitAll(kSharedBelowSoftware);
+    static const std::vector<Names>* redirected = splitAll(kRedirectedInShared);
+    return inAny(*shared, belowSoftware) && !inAny(*redirected, belowSoftware);
 }
 
 // Names from the root down to `key`, the key's own name last.
@@ -191,7 +215,7 @@ Key& ensurePath(Key& from, std::u16string_view path) {
 
 std::u16string fold(std::u16string_view name) {
     std::u16string out(name);
-    for (char16_t& c : out) c = upcase(c);
+    for (char16_t& c : out) c = foldUnit(c);
     return out;
 }
 
@@ -205,7 +229,7 @@ bool sameName(std::u16string_view a, std::u16string_view b) {
 int compareFolded(std::u16string_view folded, std::u16string_view raw) {
     size_t common = std::min(folded.size(), raw.size());
     for (size_t i = 0; i < common; ++i) {
-        char16_t f = folded[i], r = upcase(raw[i]);
+        char16_t f = folded[i], r = foldUnit(raw[i]);
         if (f != r) return f < r ? -1 : 1;
     }
     return folded.size() < raw.size() ? -1 : folded.size() > raw.size() ? 1 : 0;
@@ -339,8 +363,8 @@ LONG createPath(Key& from, const Names& names, Key*& out, bool& created) {
     for (Key* next; i < names.size() && (next = findChild(*k, names[i])); ++i) k = next;
     created = i < names.size();
     if (created) {
-        // Windows documents both limits but its error code is not recorded; like its other
-        // size limits (names too long), a tree too deep or too many new levels is 87.
+        // Windows documents both limits without the code it gives beyond them, and Wine
+        // enforces neither; 87, as for the documented limits of names.
         if (from.depth + names.size() > kMaxDepth) return ERROR_INVALID_PARAMETER;
         if (names.size() - i > kMaxNewLevels) return ERROR_INVALID_PARAMETER;
         if (k->denied & KEY_CREATE_SUB_KEY) return ERROR_ACCESS_DENIED;

@@ -33,7 +33,7 @@ BOOL failWith(DWORD code) {
 
 BOOL query(OSVERSIONINFOW* info) {
     if (auto code = w32::takeFault("GetVersionExW")) return failWith(static_cast<DWORD>(*code));
-    // A NULL record: Windows' answer is not recorded; it is a bad pointer here (998).
+    // A NULL record: Windows' answer is recorded nowhere and Wine crashes; a bad pointer (998).
     if (!info) return failWith(ERROR_NOACCESS);
     if (failing.load()) return failWith(ERROR_INVALID_PARAMETER);
     DWORD size = info->dwOSVersionInfoSize;
