@@ -28,29 +28,15 @@ const CaseRange kCaseRanges[] = {
     {0x1EA1, 0x1EFF, -1, true},   {0xFF41, 0xFF5A, -32, false},
 };
 
-// Upper case of one UTF-16 unit, the form in which the registry compares names. Windows folds
-// with its own up-case table, not ASCII only (a key made as "Été" opens as "éTÉ"); the simple
-// mappings of these alphabets stand in for it.
+// Upper case of one UTF-16 unit, the form in which the registry compares and orders names.
+// Windows folds with its own up-case table, not ASCII only (a key made as "Été" opens as "éTÉ");
+// the simple mappings of these alphabets stand in for it.
 char16_t upcase(char16_t c) {
     if (c < 0x80) return (c >= u'a' && c <= u'z') ? static_cast<char16_t>(c - 32) : c;
     for (const CaseRange& r : kCaseRanges) {
         if (c < r.first || c > r.last) continue;
         if (r.alternating && (c - r.first) % 2 != 0) return c;
         return static_cast<char16_t>(c + r.delta);
-    }
-    return c;
-}
-
-// One unit of a name's folded form: the lower case of its upper case. Names that are equal in
-// upper case stay equal, and siblings sort as their lower case, so that '_' comes before the
-// letters: the order Wine enumerates in, in 32- and 64-bit processes. Windows promises no order.
-char16_t foldUnit(char16_t c) {
-    c = upcase(c);
-    if (c < 0x80) return (c >= u'A' && c <= u'Z') ? static_cast<char16_t>(c + 32) : c;
-    for (const CaseRange& r : kCaseRanges) {
-        int lower = c - r.delta;
-        if (lower >= r.first && lower <= r.last && upcase(static_cast<char16_t>(lower)) == c)
-            return static_cast<char16_t>(lower);
     }
     return c;
 }
@@ -215,7 +201,7 @@ Key& ensurePath(Key& from, std::u16string_view path) {
 
 std::u16string fold(std::u16string_view name) {
     std::u16string out(name);
-    for (char16_t& c : out) c = foldUnit(c);
+    for (char16_t& c : out) c = upcase(c);
     return out;
 }
 
@@ -229,7 +215,7 @@ bool sameName(std::u16string_view a, std::u16string_view b) {
 int compareFolded(std::u16string_view folded, std::u16string_view raw) {
     size_t common = std::min(folded.size(), raw.size());
     for (size_t i = 0; i < common; ++i) {
-        char16_t f = folded[i], r = foldUnit(raw[i]);
+        char16_t f = folded[i], r = upcase(raw[i]);
         if (f != r) return f < r ? -1 : 1;
     }
     return folded.size() < raw.size() ? -1 : folded.size() > raw.size() ? 1 : 0;
