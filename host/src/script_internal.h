@@ -7,8 +7,24 @@
 #include <memory>
 #include <optional>
 #include <ostream>
+#include <stdexcept>
 
 namespace hv::script {
+
+// Why a line is malformed, or why running it failed. Parsers and run functions throw it; the
+// parser and the runner report it as "file:line: message".
+struct Refusal : std::runtime_error {
+    using std::runtime_error::runtime_error;
+};
+
+[[noreturn]] inline void refuse(const std::string& why) {
+    throw Refusal(why);
+}
+
+// Refuses with `error` unless it is empty.
+inline void refuseIf(const std::string& error) {
+    if (!error.empty()) refuse(error);
+}
 
 // A token of a line: a quoted text (escapes resolved) or a bare word.
 struct Token {
@@ -17,9 +33,9 @@ struct Token {
     std::string word;
 };
 
-// Splits `line` from `pos` into tokens up to its end or a comment; returns an error or "".
-// `end` receives where the tokens stop (the comment's start or the line's end).
-std::string lex(const std::string& line, size_t pos, std::vector<Token>& tokens, size_t* end);
+// Splits `line` from `pos` into tokens up to its end or a comment; `end` receives where the
+// tokens stop (the comment's start or the line's end).
+std::vector<Token> lex(const std::string& line, size_t pos, size_t* end = nullptr);
 
 // A command's operands, read front to back.
 class Operands {
@@ -34,10 +50,14 @@ public:
     std::string word();
     // The next operand when it is a quoted text.
     bool text(std::u16string& out);
+    // The next operand, which must be a quoted text; else refuses with `usage`.
+    std::u16string text(const std::string& usage);
+    // The next operand, which must be a bare 32-bit integer; else refuses with `usage`.
+    int64_t integer(const std::string& usage);
     // Takes the last operand when it is this bare word.
     bool takeLast(const char* word);
-    // "stray text 'X'" for the first operand left over, or "" when none is.
-    std::string rest() const;
+    // Refuses the first operand left over.
+    void end() const;
 
 private:
     std::vector<Token> tokens_;
@@ -49,15 +69,15 @@ private:
 std::string parseInteger(const std::string& word, int bits, uint64_t& value);
 // The same for 32 bits, as written: -2147483648 to 4294967295.
 std::string parseInteger(const std::string& word, int64_t& value);
-// Reads an event parameter; returns an error or "".
-std::string parseArgument(const Token& token, Argument& argument);
+// Reads an event parameter.
+Argument parseArgument(const Token& token);
 // Takes a view word off the end of a registry line: KEY_WOW64_64KEY for view64,
 // KEY_WOW64_32KEY for view32, or 0 for the default view.
 uint32_t takeView(Operands& in);
-// Reads one of the five root key names (no root:N) for a registry line; returns an error or "".
-std::string parseRootName(const Token* token, const std::string& usage, uint32_t& root);
+// Reads one of the five root key names (no root:N) for a registry line; refuses with `usage`.
+uint32_t parseRootName(const Token* token, const std::string& usage);
 // Hex bytes written as pairs of digits, blanks allowed between whole bytes: "01 02ff".
-std::string parseHex(const std::u16string& text, std::vector<uint8_t>& data);
+std::vector<uint8_t> parseHex(const std::u16string& text);
 // Bytes as "[61 00 ff]".
 std::string hexList(const std::vector<uint8_t>& bytes);
 // The name of a predefined root by its index (HKEY_CLASSES_ROOT ...), or "" past the fifth.
@@ -65,15 +85,14 @@ const char* rootKeyName(uint32_t index);
 // The predefined handle of a root by its index, below 5.
 HKEY rootKeyHandle(uint32_t index);
 
-// The command parsers, by the word that starts their lines: each fills `command` and returns
-// an error or "".
-using Parser = std::string (*)(Operands& in, Command& command);
-std::string parseExpect(Operands& in, Command& command);
-std::string parseRegistry(Operands& in, Command& command);
-std::string parseLayer(Operands& in, Command& command);
-std::string parseStateFile(Operands& in, Command& command, bool save);
-std::string parseFileBytes(Operands& in, Command& command, bool check);
-std::string parseParam(Operands& in, Command& command);
+// The command parsers, by the word that starts their lines.
+using Parser = Command (*)(Operands& in);
+Command parseExpect(Operands& in);
+Command parseRegistry(Operands& in);
+Command parseLayer(Operands& in);
+Command parseParam(Operands& in);
+StateFile parseStateFile(Operands& in, bool save);
+FileBytes parseFileBytes(Operands& in, bool check);
 // The parser of the command named `name`, or null.
 Parser findCommand(const std::string& name);
 // Whether `word`, after `layer`, starts a line of the layer's own (deny, fail ...); `next` is
@@ -110,10 +129,12 @@ public:
     void show(const Step& step, const std::string& detail);
     // Shows a line that this build cannot run, with the reason.
     void skip(const Step& step, const std::string& why);
-    // Counts an expectation and shows it when it holds; passes on why it does not, or "".
-    std::string checked(const Step& step, const std::string& why);
+    // Counts an expectation; shows it when it holds, or refuses with why it does not.
+    void checked(const Step& step, const std::string& why);
     void remember(EventKind kind, Outcome outcome);
     const Outcome* last() const { return last_ ? &*last_ : nullptr; }
+    // The last event's outcome; refuses when no event ran on this instance.
+    const Outcome& lastEvent() const;
     EventKind lastKind() const { return lastKind_; }
     // The root-key parameter record, made when a param line first runs.
     ParamState& param();
@@ -137,36 +158,36 @@ private:
     std::shared_ptr<ParamState> param_;
 };
 
-// What running a line does: "" when it passed, or why it failed.
-std::string run(Session& s, const Step& step, const Event& line);
-std::string run(Session& s, const Step& step, const Show& line);
-std::string run(Session& s, const Step& step, const Echo& line);
-std::string run(Session& s, const Step& step, const New& line);
-std::string run(Session& s, const Step& step, const Buffers& line);
-std::string run(Session& s, const Step& step, const Poke& line);
-std::string run(Session& s, const Step& step, const ExpectResult& line);
-std::string run(Session& s, const Step& step, const ExpectNumber& line);
-std::string run(Session& s, const Step& step, const ExpectBuffers& line);
-std::string run(Session& s, const Step& step, const ExpectAddress& line);
-std::string run(Session& s, const Step& step, const ExpectCurrentKey& line);
-std::string run(Session& s, const Step& step, const ExpectSentence& line);
-std::string run(Session& s, const Step& step, const ExpectDebug& line);
-std::string run(Session& s, const Step& step, const Registry& line);
-std::string run(Session& s, const Step& step, const Deny& line);
-std::string run(Session& s, const Step& step, const Fail& line);
-std::string run(Session& s, const Step& step, const Clear& line);
-std::string run(Session& s, const Step& step, const Hide& line);
-std::string run(Session& s, const Step& step, const Version& line);
-std::string run(Session& s, const Step& step, const Handles& line);
-std::string run(Session& s, const Step& step, const Calls& line);
-std::string run(Session& s, const Step& step, const StateFile& line);
-std::string run(Session& s, const Step& step, const FileBytes& line);
-std::string run(Session& s, const Step& step, const Debug& line);
-std::string run(Session& s, const Step& step, const ParamRecord& line);
-std::string run(Session& s, const Step& step, const ParamInit& line);
-std::string run(Session& s, const Step& step, const ParamEdit& line);
-std::string run(Session& s, const Step& step, const ParamString& line);
-std::string run(Session& s, const Step& step, const ParamExpect& line);
+// What running a line does; a failure is thrown.
+void run(Session& s, const Step& step, const Event& line);
+void run(Session& s, const Step& step, const Show& line);
+void run(Session& s, const Step& step, const Echo& line);
+void run(Session& s, const Step& step, const New& line);
+void run(Session& s, const Step& step, const Buffers& line);
+void run(Session& s, const Step& step, const Poke& line);
+void run(Session& s, const Step& step, const ExpectResult& line);
+void run(Session& s, const Step& step, const ExpectNumber& line);
+void run(Session& s, const Step& step, const ExpectBuffers& line);
+void run(Session& s, const Step& step, const ExpectAddress& line);
+void run(Session& s, const Step& step, const ExpectCurrentKey& line);
+void run(Session& s, const Step& step, const ExpectSentence& line);
+void run(Session& s, const Step& step, const ExpectDebug& line);
+void run(Session& s, const Step& step, const Registry& line);
+void run(Session& s, const Step& step, const Deny& line);
+void run(Session& s, const Step& step, const Fail& line);
+void run(Session& s, const Step& step, const Clear& line);
+void run(Session& s, const Step& step, const Hide& line);
+void run(Session& s, const Step& step, const Version& line);
+void run(Session& s, const Step& step, const Handles& line);
+void run(Session& s, const Step& step, const Calls& line);
+void run(Session& s, const Step& step, const StateFile& line);
+void run(Session& s, const Step& step, const FileBytes& line);
+void run(Session& s, const Step& step, const Debug& line);
+void run(Session& s, const Step& step, const ParamRecord& line);
+void run(Session& s, const Step& step, const ParamInit& line);
+void run(Session& s, const Step& step, const ParamEdit& line);
+void run(Session& s, const Step& step, const ParamString& line);
+void run(Session& s, const Step& step, const ParamExpect& line);
 
 // Marks where the layer's journal stands, and reads what it served since the mark.
 size_t journalMark();

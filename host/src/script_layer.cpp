@@ -35,107 +35,89 @@ bool isName(const std::string& word) {
     return true;
 }
 
-// Reads the next operand as an integer; `usage` when it is missing or quoted.
-std::string integer(Operands& in, const std::string& usage, int64_t& value) {
-    std::string word = in.word();
-    return word.empty() ? usage : parseInteger(word, value);
-}
-
 // layer deny ROOT "path" RIGHTS [view64|view32]
-std::string parseDeny(Operands& in, Command& command) {
+Command parseDeny(Operands& in) {
     const char* usage = "layer deny takes a root key name, a key path in quotes and the rights";
     Deny deny;
     deny.key.view = takeView(in);
-    if (std::string error = parseRootName(in.next(), usage, deny.key.root); !error.empty())
-        return error;
-    int64_t rights = 0;
-    if (!in.text(deny.key.path)) return usage;
-    if (std::string error = integer(in, usage, rights); !error.empty()) return error;
-    deny.rights = static_cast<uint32_t>(rights);
-    command = std::move(deny);
-    return in.rest();
+    deny.key.root = parseRootName(in.next(), usage);
+    deny.key.path = in.text(usage);
+    deny.rights = static_cast<uint32_t>(in.integer(usage));
+    in.end();
+    return deny;
 }
 
 // layer fail FUNCTION NTH|always CODE
-std::string parseFail(Operands& in, Command& command) {
+Command parseFail(Operands& in) {
     const char* usage = "layer fail takes a function, which call (1 for the next, or always) "
                         "and the code";
-    if (in.left() < 3 || in.peek()->quoted || in.peek(1)->quoted) return usage;
+    if (in.left() < 3 || in.peek()->quoted || in.peek(1)->quoted) refuse(usage);
     Fail fail;
     fail.function = in.word();
     bool known = false;
     for (const char* f : FailableFunctions) known = known || fail.function == f;
-    if (!known) return "the layer cannot fail '" + fail.function + "'";
+    if (!known) refuse("the layer cannot fail '" + fail.function + "'");
     std::string nth = in.word();
     int64_t n = 0;
-    if (nth != "always") {
-        if (std::string error = parseInteger(nth, n); !error.empty()) return error;
-        if (n < 1) return "layer fail counts calls from 1";
-    }
+    if (nth != "always") refuseIf(parseInteger(nth, n));
+    if (nth != "always" && n < 1) refuse("layer fail counts calls from 1");
     fail.nth = static_cast<unsigned>(n);
-    if (std::string error = integer(in, usage, n); !error.empty()) return error;
-    fail.code = static_cast<int32_t>(n);
-    command = std::move(fail);
-    return in.rest();
+    fail.code = static_cast<int32_t>(in.integer(usage));
+    in.end();
+    return fail;
 }
 
 // layer hide NAME / layer unhide NAME
-std::string parseHide(Operands& in, Command& command, bool hide) {
-    std::string name = in.word();
-    if (!isName(name)) return std::string("layer ") + (hide ? "hide" : "unhide") + " takes an export name";
+Command parseHide(Operands& in, bool hide) {
     Hide line;
-    line.name = name;
+    line.name = in.word();
     line.hide = hide;
-    command = std::move(line);
-    return in.rest();
+    if (!isName(line.name))
+        refuse(std::string("layer ") + (hide ? "hide" : "unhide") + " takes an export name");
+    in.end();
+    return line;
 }
 
 // layer version fail | normal | platform N
-std::string parseVersion(Operands& in, Command& command) {
+Command parseVersion(Operands& in) {
     const char* usage = "layer version takes fail, normal or platform and a number";
     std::string how = in.word();
+    if (how != "fail" && how != "normal" && how != "platform") refuse(usage);
     Version version;
     version.how = how == "fail" ? Version::How::Fail : how == "normal" ? Version::How::Normal
                                                                        : Version::How::Platform;
-    if (how != "fail" && how != "normal" && how != "platform") return usage;
-    int64_t id = 0;
-    if (how == "platform")
-        if (std::string error = integer(in, usage, id); !error.empty()) return error;
-    version.platform = static_cast<uint32_t>(id);
-    command = version;
-    return in.rest();
+    if (how == "platform") version.platform = static_cast<uint32_t>(in.integer(usage));
+    in.end();
+    return version;
 }
 
 // layer expect handles N / layer expect calls FUNCTION N / layer expect calls FUNCTION mask M
-std::string parseLayerExpect(Operands& in, Command& command) {
+Command parseLayerExpect(Operands& in) {
     if (in.word() == "handles") {
         const char* usage = "layer expect handles needs a count";
-        int64_t n = 0;
-        if (std::string error = integer(in, usage, n); !error.empty()) return error;
-        if (n < 0) return usage;
         Handles handles;
+        int64_t n = in.integer(usage);
+        if (n < 0) refuse(usage);
         handles.count = static_cast<size_t>(n);
-        command = handles;
-        return in.rest();
+        in.end();
+        return handles;
     }
     const char* usage = "layer expect calls takes a function and a count, or mask and a mask";
-    if (in.left() < 2 || in.peek()->quoted || !isName(in.peek()->word)) return usage;
+    if (in.left() < 2 || in.peek()->quoted || !isName(in.peek()->word)) refuse(usage);
     Calls calls;
     calls.function = in.word();
-    const Token* t = in.peek();
-    if (!t->quoted && t->word == "mask") {
+    if (!in.peek()->quoted && in.peek()->word == "mask") {
         bool masked = false;
         for (auto [function, index] : MaskArguments) masked = masked || calls.function == function;
-        if (!masked) return calls.function + " takes no access mask";
+        if (!masked) refuse(calls.function + " takes no access mask");
         in.word();
         calls.mask = true;
     }
-    int64_t n = 0;
-    if (std::string error = integer(in, usage, n); !error.empty()) return error;
-    if (n < 0 && !calls.mask) return usage;
+    int64_t n = in.integer(usage);
+    if (n < 0 && !calls.mask) refuse(usage);
     calls.number = calls.mask ? static_cast<uint32_t>(n) : static_cast<uint64_t>(n);
-    command = std::move(calls);
-    return in.rest();
+    in.end();
+    return calls;
 }
 
 }  // namespace
@@ -147,54 +129,50 @@ bool isLayerVerb(const std::string& word, const std::string& next) {
     return false;
 }
 
-std::string parseLayer(Operands& in, Command& command) {
+Command parseLayer(Operands& in) {
     const Token* next = in.peek(1);
     std::string verb = in.word();
     if (!isLayerVerb(verb, next && !next->quoted ? next->word : ""))
-        return "layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
-               "expect handles, expect calls";
-    if (verb == "clear") command = Clear{};
-    if (verb == "deny") return parseDeny(in, command);
-    if (verb == "fail") return parseFail(in, command);
-    if (verb == "hide" || verb == "unhide") return parseHide(in, command, verb == "hide");
-    if (verb == "version") return parseVersion(in, command);
-    if (verb == "expect") return parseLayerExpect(in, command);
-    return in.rest();
+        refuse("layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
+               "expect handles, expect calls");
+    if (verb == "deny") return parseDeny(in);
+    if (verb == "fail") return parseFail(in);
+    if (verb == "hide" || verb == "unhide") return parseHide(in, verb == "hide");
+    if (verb == "version") return parseVersion(in);
+    if (verb == "expect") return parseLayerExpect(in);
+    in.end();
+    return Clear{};
 }
 
 #ifndef _WIN32
 
-std::string run(Session& session, const Step& step, const Deny& line) {
+void run(Session& session, const Step& step, const Deny& line) {
     w32test::denyAccess(rootKeyHandle(line.key.root), line.key.path, line.rights | line.key.view);
     session.layerChanges.denials.push_back(line.key);
     session.show(step, line.rights ? "denied" : "lifted");
-    return std::string();
 }
 
-std::string run(Session& session, const Step& step, const Fail& line) {
+void run(Session& session, const Step& step, const Fail& line) {
     if (line.nth)
         w32test::failCall(line.function, line.nth, line.code);
     else
         w32test::failAlways(line.function, line.code);
     session.layerChanges.faults = true;
     session.show(step, "armed");
-    return std::string();
 }
 
-std::string run(Session& session, const Step& step, const Clear&) {
+void run(Session& session, const Step& step, const Clear&) {
     w32test::clearFaults();
     session.show(step, "no call fails");
-    return std::string();
 }
 
-std::string run(Session& session, const Step& step, const Hide& line) {
+void run(Session& session, const Step& step, const Hide& line) {
     w32test::hideExport(line.name.c_str(), line.hide);
     if (line.hide) session.layerChanges.hidden.push_back(line.name);
     session.show(step, line.hide ? "hidden" : "found again");
-    return std::string();
 }
 
-std::string run(Session& session, const Step& step, const Version& line) {
+void run(Session& session, const Step& step, const Version& line) {
     w32test::setVersionFault(line.how == Version::How::Fail);
     if (line.how == Version::How::Normal) w32test::setPlatformId(VER_PLATFORM_WIN32_NT);
     if (line.how == Version::How::Platform) w32test::setPlatformId(line.platform);
@@ -202,21 +180,18 @@ std::string run(Session& session, const Step& step, const Version& line) {
     const char* const shown[] = {"GetVersionExW fails", "GetVersionExW answers as usual",
                                  "GetVersionExW reports this platform"};
     session.show(step, shown[static_cast<size_t>(line.how)]);
-    return std::string();
 }
 
-std::string run(Session& session, const Step& step, const Handles& line) {
+void run(Session& session, const Step& step, const Handles& line) {
     size_t open = w32test::openHandleCount();
-    std::string why;
-    if (open != line.count)
-        why = "expected " + std::to_string(line.count) + " registry handles open, got " +
-              std::to_string(open);
-    return session.checked(step, why);
+    session.checked(step, open == line.count ? "" : "expected " + std::to_string(line.count) +
+                                                        " registry handles open, got " +
+                                                        std::to_string(open));
 }
 
 // Counts the calls of the last event, or checks that every one carried the mask.
-std::string run(Session& session, const Step& step, const Calls& line) {
-    if (!session.last()) return session.checked(step, "expect with no event before it");
+void run(Session& session, const Step& step, const Calls& line) {
+    session.lastEvent();  // refuses when no event ran
     std::vector<uint64_t> masks;
     for (const LayerCall& c : session.eventCalls) {
         if (c.function != line.function) continue;
@@ -235,7 +210,7 @@ std::string run(Session& session, const Step& step, const Calls& line) {
             why = "expected every " + line.function + " of the last event to ask for " +
                   hex(line.number) + ", call " + std::to_string(i + 1) + " asked for " +
                   hex(masks[i]);
-    return session.checked(step, why);
+    session.checked(step, why);
 }
 
 #endif

@@ -15,8 +15,8 @@ bool isHex(char c) {
     return std::isxdigit(static_cast<unsigned char>(c)) != 0;
 }
 
-// Resolves the escape after a backslash at `pos`; returns an error or "".
-std::string escape(const std::string& line, size_t& pos, std::u16string& text) {
+// Resolves the escape after a backslash at `pos`.
+void escape(const std::string& line, size_t& pos, std::u16string& text) {
     char c = line[pos];
     switch (c) {
         case '\\': text += u'\\'; break;
@@ -29,19 +29,18 @@ std::string escape(const std::string& line, size_t& pos, std::u16string& text) {
             size_t valid = 0;
             while (valid < digits.size() && isHex(digits[valid])) ++valid;
             if (valid < 4)
-                return "bad escape \\u" + digits.substr(0, valid) + " (\\u takes four hex digits)";
+                refuse("bad escape \\u" + digits.substr(0, valid) + " (\\u takes four hex digits)");
             text += static_cast<char16_t>(std::stoul(digits, nullptr, 16));
             pos += 4;
             break;
         }
-        default: return std::string("bad escape \\") + c;
+        default: refuse(std::string("bad escape \\") + c);
     }
     ++pos;
-    return std::string();
 }
 
 // Reads a quoted text whose opening quote is at `pos`.
-std::string quoted(const std::string& line, size_t& pos, Token& token) {
+void quoted(const std::string& line, size_t& pos, Token& token) {
     std::string run;  // UTF-8 bytes since the last escape
     for (++pos; pos < line.size() && line[pos] != '"'; ++pos) {
         if (line[pos] != '\\') {
@@ -51,26 +50,23 @@ std::string quoted(const std::string& line, size_t& pos, Token& token) {
         if (++pos == line.size()) break;
         token.text += fromUtf8(run);
         run.clear();
-        std::string error = escape(line, pos, token.text);
-        if (!error.empty()) return error;
+        escape(line, pos, token.text);
         --pos;
     }
-    if (pos >= line.size()) return "missing closing quote";
+    if (pos >= line.size()) refuse("missing closing quote");
     token.text += fromUtf8(run);
     ++pos;
     if (pos < line.size() && !isBlank(line[pos]) && line[pos] != '#')
-        return "text after a closing quote";
+        refuse("text after a closing quote");
     token.quoted = true;
-    return std::string();
 }
 
 // Reads a bare word starting at `pos`.
-std::string bare(const std::string& line, size_t& pos, Token& token) {
+void bare(const std::string& line, size_t& pos, Token& token) {
     size_t start = pos;
     while (pos < line.size() && !isBlank(line[pos]) && line[pos] != '#') ++pos;
     token.word = line.substr(start, pos - start);
-    if (token.word.find('"') != std::string::npos) return "stray quote in '" + token.word + "'";
-    return std::string();
+    if (token.word.find('"') != std::string::npos) refuse("stray quote in '" + token.word + "'");
 }
 
 const char* const RootNames[] = {"HKEY_CLASSES_ROOT", "HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER",
@@ -91,20 +87,17 @@ bool looksNumeric(const std::string& word) {
 
 }  // namespace
 
-std::string lex(const std::string& line, size_t pos, std::vector<Token>& tokens, size_t* end) {
-    *end = line.size();
+std::vector<Token> lex(const std::string& line, size_t pos, size_t* end) {
+    std::vector<Token> tokens;
     while (true) {
         while (pos < line.size() && isBlank(line[pos])) ++pos;
-        if (pos >= line.size()) return std::string();
-        if (line[pos] == '#') {
-            *end = pos;
-            return std::string();
-        }
+        if (pos >= line.size() || line[pos] == '#') break;
         Token token;
-        std::string error = line[pos] == '"' ? quoted(line, pos, token) : bare(line, pos, token);
-        if (!error.empty()) return error;
+        line[pos] == '"' ? quoted(line, pos, token) : bare(line, pos, token);
         tokens.push_back(std::move(token));
     }
+    if (end) *end = pos;
+    return tokens;
 }
 
 const Token* Operands::peek(size_t ahead) const {
@@ -126,16 +119,28 @@ bool Operands::text(std::u16string& out) {
     return true;
 }
 
+std::u16string Operands::text(const std::string& usage) {
+    std::u16string out;
+    if (!text(out)) refuse(usage);
+    return out;
+}
+
+int64_t Operands::integer(const std::string& usage) {
+    std::string number = word();
+    if (number.empty()) refuse(usage);
+    int64_t value = 0;
+    refuseIf(parseInteger(number, value));
+    return value;
+}
+
 bool Operands::takeLast(const char* word) {
     bool found = left() && !tokens_.back().quoted && tokens_.back().word == word;
     if (found) tokens_.pop_back();
     return found;
 }
 
-std::string Operands::rest() const {
-    const Token* t = peek();
-    if (!t) return std::string();
-    return "stray text '" + (t->quoted ? quote(t->text) : t->word) + "'";
+void Operands::end() const {
+    if (const Token* t = peek()) refuse("stray text '" + (t->quoted ? quote(t->text) : t->word) + "'");
 }
 
 std::string parseInteger(const std::string& word, int bits, uint64_t& value) {
@@ -164,8 +169,9 @@ std::string parseInteger(const std::string& word, int64_t& value) {
     return error;
 }
 
-std::string parseArgument(const Token& token, Argument& argument) {
+Argument parseArgument(const Token& token) {
     const std::string& w = token.word;
+    Argument argument;
     Param& p = argument.value;
     int64_t n = 0;
     if (token.quoted) {
@@ -177,20 +183,19 @@ std::string parseArgument(const Token& token, Argument& argument) {
     } else if (w.compare(0, 5, "root:") == 0) {
         std::string number = w.substr(5);
         if (number.empty() || number[0] == '-' || !parseInteger(number, n).empty())
-            return "bad root index '" + w + "' (root:N takes 0 to 4294967295)";
+            refuse("bad root index '" + w + "' (root:N takes 0 to 4294967295)");
         p = Param::rootKey(static_cast<uint32_t>(n));
     } else if (looksNumeric(w)) {
-        std::string error = parseInteger(w, n);
+        refuseIf(parseInteger(w, n));
         p = Param::integerValue(static_cast<int32_t>(static_cast<uint32_t>(n)));
-        return error;
     } else if (rootIndexOf(w) >= 0) {
         p = Param::rootKey(static_cast<uint32_t>(rootIndexOf(w)));
     } else if (w.compare(0, 5, "HKEY_") == 0) {
-        return "unknown root key name '" + w + "'";
+        refuse("unknown root key name '" + w + "'");
     } else {
-        return "stray text '" + w + "'";
+        refuse("stray text '" + w + "'");
     }
-    return std::string();
+    return argument;
 }
 
 uint32_t takeView(Operands& in) {
@@ -198,27 +203,25 @@ uint32_t takeView(Operands& in) {
     return in.takeLast("view32") ? KEY_WOW64_32KEY : 0;
 }
 
-std::string parseRootName(const Token* token, const std::string& usage, uint32_t& root) {
+uint32_t parseRootName(const Token* token, const std::string& usage) {
     int index = token && !token->quoted ? rootIndexOf(token->word) : -1;
-    if (index >= 0) {
-        root = static_cast<uint32_t>(index);
-        return std::string();
-    }
-    if (token && !token->quoted && token->word.compare(0, 5, "HKEY_") == 0)
-        return "unknown root key name '" + token->word + "'";
-    return usage;
+    if (index < 0 && token && !token->quoted && token->word.compare(0, 5, "HKEY_") == 0)
+        refuse("unknown root key name '" + token->word + "'");
+    if (index < 0) refuse(usage);
+    return static_cast<uint32_t>(index);
 }
 
-std::string parseHex(const std::u16string& text, std::vector<uint8_t>& data) {
+std::vector<uint8_t> parseHex(const std::u16string& text) {
     std::string ascii;
     for (char16_t c : text) ascii += c < 0x80 ? static_cast<char>(c) : '?';
+    std::vector<uint8_t> data;
     for (size_t i = 0; i < ascii.size(); ++i) {
         if (isBlank(ascii[i])) continue;
         if (i + 1 >= ascii.size() || !isHex(ascii[i]) || !isHex(ascii[i + 1]))
-            return "bad hex bytes '" + ascii + "' (pairs of hex digits, blanks only between bytes)";
+            refuse("bad hex bytes '" + ascii + "' (pairs of hex digits, blanks only between bytes)");
         data.push_back(static_cast<uint8_t>(std::stoul(ascii.substr(i++, 2), nullptr, 16)));
     }
-    return std::string();
+    return data;
 }
 
 std::string hexList(const std::vector<uint8_t>& bytes) {

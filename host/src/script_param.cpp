@@ -31,9 +31,11 @@ ParamState& Session::param() {
 namespace {
 
 // An integer operand.
-std::string integerOperand(const Token* t, int64_t& value) {
-    if (t->quoted) return "expected an integer, not " + quote(t->text);
-    return parseInteger(t->word, value);
+int64_t integerOperand(const Token* t) {
+    if (t->quoted) refuse("expected an integer, not " + quote(t->text));
+    int64_t value = 0;
+    refuseIf(parseInteger(t->word, value));
+    return value;
 }
 
 // The words of the scripted user's steps.
@@ -44,30 +46,25 @@ const std::pair<const char*, UserStep::Action> StepWords[] = {
     {"escape", UserStep::Action::Escape}, {"close", UserStep::Action::CloseBox}};
 
 // param edit STEP...: select N, double N, ok, cancel, enter, escape, close, wait MS.
-std::string parseEdit(Operands& in, Command& command) {
+Command parseEdit(Operands& in) {
     ParamEdit edit;
     while (const Token* t = in.next()) {
-        if (t->quoted) return "a dialog step is a word, not " + quote(t->text);
+        if (t->quoted) refuse("a dialog step is a word, not " + quote(t->text));
         const std::string& w = t->word;
-        UserStep step;
         auto known = std::find_if(std::begin(StepWords), std::end(StepWords),
                                   [&](const auto& s) { return w == s.first; });
         if (known == std::end(StepWords))
-            return "unknown dialog step '" + w +
-                   "' (select N, double N, ok, cancel, enter, escape, close or wait MS)";
-        step.action = known->second;
-        if (step.action == UserStep::Action::Select || step.action == UserStep::Action::Wait ||
-            step.action == UserStep::Action::DoubleClick) {
+            refuse("unknown dialog step '" + w +
+                   "' (select N, double N, ok, cancel, enter, escape, close or wait MS)");
+        UserStep step{known->second, 0};
+        if (w == "select" || w == "double" || w == "wait") {
             const Token* n = in.next();
-            if (!n) return w + (w == "wait" ? " needs milliseconds" : " needs a list position");
-            int64_t value = 0;
-            if (std::string e = integerOperand(n, value); !e.empty()) return e;
-            step.index = static_cast<int>(value);
+            if (!n) refuse(w + (w == "wait" ? " needs milliseconds" : " needs a list position"));
+            step.index = static_cast<int>(integerOperand(n));
         }
         edit.steps.push_back(step);
     }
-    command = std::move(edit);
-    return std::string();
+    return edit;
 }
 
 const char* const ExpectUsage =
@@ -82,49 +79,47 @@ const std::pair<const char*, ParamExpect::What> ExpectWords[] = {
     {"ranout", ParamExpect::What::RanOut},   {"untouched", ParamExpect::What::Untouched}};
 
 // The operands of `param expect WHAT`, by the kind of value WHAT takes.
-std::string parseExpectOperands(Operands& in, const std::string& what, ParamExpect& line) {
+void parseExpectOperands(Operands& in, const std::string& what, ParamExpect& line) {
     using What = ParamExpect::What;
     size_t n = in.left();
     switch (line.what) {
         case What::Index:
         case What::Result:
         case What::Selection:
-            if (n != 1) return ExpectUsage;
-            if (line.what == What::Selection && in.peek()->word == "none" && !in.peek()->quoted) {
+            if (n != 1) refuse(ExpectUsage);
+            if (line.what == What::Selection && in.peek()->word == "none" && !in.peek()->quoted)
                 line.number = LB_ERR;
-                return std::string();
-            }
-            return integerOperand(in.next(), line.number);
+            else
+                line.number = integerOperand(in.next());
+            return;
         case What::Items:
         case What::Caption:
         case What::Text:
         case What::Bytes:
-            if (n == 0 || (line.what != What::Items && n != 1)) return ExpectUsage;
-            for (std::u16string text; in.left(); line.texts.push_back(text))
-                if (!in.text(text)) return what + " takes texts in quotes";
-            return line.what == What::Bytes ? parseHex(line.texts[0], line.bytes) : std::string();
+            if (n == 0 || (line.what != What::Items && n != 1)) refuse(ExpectUsage);
+            while (in.left()) line.texts.push_back(in.text(what + " takes texts in quotes"));
+            if (line.what == What::Bytes) line.bytes = parseHex(line.texts[0]);
+            return;
         case What::Open:
         case What::RanOut:
-            if (n == 0 || (line.what == What::RanOut && n != 1)) return ExpectUsage;
-            for (std::string w; in.left(); line.flags.push_back(w == "yes")) {
-                w = in.word();
-                if (w != "yes" && w != "no") return what + " takes yes or no";
-            }
-            return std::string();
-        default: return n == 0 ? std::string() : ExpectUsage;
+            if (n == 0 || (line.what == What::RanOut && n != 1)) refuse(ExpectUsage);
+            for (std::string w; in.left(); line.flags.push_back(w == "yes"))
+                if (w = in.word(); w != "yes" && w != "no") refuse(what + " takes yes or no");
+            return;
+        default:
+            if (n) refuse(ExpectUsage);
     }
 }
 
-std::string parseExpectLine(Operands& in, Command& command) {
+Command parseExpectLine(Operands& in) {
     std::string what = in.word();
-    ParamExpect line;
     auto known = std::find_if(std::begin(ExpectWords), std::end(ExpectWords),
                               [&](const auto& w) { return what == w.first; });
-    if (known == std::end(ExpectWords)) return ExpectUsage;
+    if (known == std::end(ExpectWords)) refuse(ExpectUsage);
+    ParamExpect line;
     line.what = known->second;
-    std::string error = parseExpectOperands(in, what, line);
-    command = std::move(line);
-    return error;
+    parseExpectOperands(in, what, line);
+    return line;
 }
 
 std::string whatWord(ParamExpect::What what) {
@@ -208,53 +203,43 @@ std::string why(const ParamExpect& line, const ParamState& s) {
 
 }  // namespace
 
-std::string parseParam(Operands& in, Command& command) {
+Command parseParam(Operands& in) {
     std::string verb = in.word();
-    if (verb == "init") {
-        command = ParamInit{};
-        return in.left() ? "stray text after param init" : std::string();
-    }
-    if (verb == "edit") return parseEdit(in, command);
-    if (verb == "expect") return parseExpectLine(in, command);
+    if (verb == "init" && in.left()) refuse("stray text after param init");
+    if (verb == "init") return ParamInit{};
+    if (verb == "edit") return parseEdit(in);
+    if (verb == "expect") return parseExpectLine(in);
     if (verb != "record" && verb != "fill" && verb != "string")
-        return "param takes init, record, fill, edit, string or expect";
-    if (in.left() != 1) return "param " + verb + " takes one value";
-    Argument value;
-    int64_t n = 0;
-    std::string error = verb == "record" ? parseArgument(*in.peek(), value)
-                                         : integerOperand(in.peek(), n);
-    if (!error.empty()) return error;
-    if (verb == "string") {
-        command = ParamString{static_cast<Slot>(n)};
-        return std::string();
-    }
+        refuse("param takes init, record, fill, edit, string or expect");
+    if (in.left() != 1) refuse("param " + verb + " takes one value");
+    if (verb == "fill") return ParamRecord{true, static_cast<uint32_t>(integerOperand(in.peek()))};
+    if (verb == "string") return ParamString{static_cast<Slot>(integerOperand(in.peek()))};
+    Argument value = parseArgument(*in.peek());
     Param::Kind kind = value.value.kind;
-    if (verb == "record" && (value.lastResult || (kind != Param::Kind::RootKey && kind != Param::Kind::Integer)))
-        return "param record takes a root key name or an index";
-    uint32_t index = kind == Param::Kind::RootKey ? value.value.rootIndex
-                                                  : static_cast<uint32_t>(value.value.integer);
-    command = ParamRecord{verb == "fill", verb == "fill" ? static_cast<uint32_t>(n) : index};
-    return std::string();
+    if (value.lastResult || (kind != Param::Kind::RootKey && kind != Param::Kind::Integer))
+        refuse("param record takes a root key name or an index");
+    return ParamRecord{false, kind == Param::Kind::RootKey
+                                  ? value.value.rootIndex
+                                  : static_cast<uint32_t>(value.value.integer)};
 }
 
-std::string run(Session& session, const Step& step, const ParamInit&) {
+void run(Session& session, const Step& step, const ParamInit&) {
     ParamEditor& param = session.param().param;
     param.init();
     session.show(step, "=> " + hexList(param.recordBytes()));
-    return param.recordIntact() ? "" : "sentinel hit after the record";
+    if (!param.recordIntact()) refuse("sentinel hit after the record");
 }
 
-std::string run(Session& session, const Step& step, const ParamRecord& line) {
+void run(Session& session, const Step& step, const ParamRecord& line) {
     ParamEditor& param = session.param().param;
     if (line.fill)
         param.fillRecord(static_cast<uint8_t>(line.value));
     else
         param.setRecord(line.value);
     session.show(step, hexList(param.recordBytes()));
-    return std::string();
 }
 
-std::string run(Session& session, const Step& step, const ParamEdit& line) {
+void run(Session& session, const Step& step, const ParamEdit& line) {
     ParamState& s = session.param();
     s.result = s.param.edit(line.steps, &s.seen);
     s.edited = true;
@@ -269,20 +254,20 @@ std::string run(Session& session, const Step& step, const ParamEdit& line) {
         detail += "; no dialog appeared";
     if (seen.ranOut) detail += "; steps ran out, left with Cancel";
     session.show(step, detail + ")");
-    if (seen.forced) return "the dialog stayed open after Cancel";
-    return s.param.recordIntact() ? "" : "sentinel hit after the record";
+    if (seen.forced) refuse("the dialog stayed open after Cancel");
+    if (!s.param.recordIntact()) refuse("sentinel hit after the record");
 }
 
-std::string run(Session& session, const Step& step, const ParamString& line) {
+void run(Session& session, const Step& step, const ParamString& line) {
     ParamState& s = session.param();
     s.text = s.param.string(line.capacity);
     s.copied = true;
     session.show(step, s.text.untouched ? "=> buffer untouched" : "=> " + quote(s.text.text));
-    return s.text.intact ? "" : "sentinel hit: written past the capacity";
+    if (!s.text.intact) refuse("sentinel hit: written past the capacity");
 }
 
-std::string run(Session& session, const Step& step, const ParamExpect& line) {
-    return session.checked(step, why(line, session.param()));
+void run(Session& session, const Step& step, const ParamExpect& line) {
+    session.checked(step, why(line, session.param()));
 }
 
 }  // namespace hv::script

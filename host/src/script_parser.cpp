@@ -34,25 +34,23 @@ struct LineShape {
 
 // Nothing but a comment may follow a brace; `what` names the brace in the message, or is empty
 // for the message of any other stray operand.
-std::string braceOnly(const std::string& line, size_t pos, const std::string& what) {
-    std::vector<Token> rest;
-    size_t end = 0;
-    std::string error = lex(line, pos, rest, &end);
-    if (!error.empty() || rest.empty()) return error;
-    return what.empty() ? Operands(rest).rest() : "stray text after " + what;
+void braceOnly(const std::string& line, size_t pos, const std::string& what) {
+    Operands rest(lex(line, pos));
+    if (what.empty()) rest.end();
+    if (rest.left()) refuse("stray text after " + what);
 }
 
 // Parses the line from `pos` into `step`. A `layer` before an ordinary command marks that line
 // as one for the portable layer only, a `process32` as one for a 32-bit process's registry view.
-std::string parseLine(const std::string& line, size_t pos, Step& step, LineShape& shape) {
+void parseLine(const std::string& line, size_t pos, Step& step, LineShape& shape) {
     size_t start = line.find_first_not_of(" \t", pos);
-    if (start == std::string::npos || line[start] == '#') return std::string();
+    if (start == std::string::npos || line[start] == '#') return;
     size_t stop = 0, next = 0, unused = 0;
     std::string word = wordAt(line, start, &stop);
     if (word == "layer") {
         std::string verb = wordAt(line, stop, &next);
-        if (verb == "layer") return "layer is written once";
-        if (verb == "}") return "} stands alone on its line";
+        if (verb == "layer") refuse("layer is written once");
+        if (verb == "}") refuse("} stands alone on its line");
         if (verb == "{") {
             shape.opens = word;
             return braceOnly(line, next, "");
@@ -63,7 +61,7 @@ std::string parseLine(const std::string& line, size_t pos, Step& step, LineShape
     }
     if (word == "process32") {
         std::string after = wordAt(line, stop, &next);
-        if (after == "process32") return "process32 is written once";
+        if (after == "process32") refuse("process32 is written once");
         if (after != "{") {
             step.process32Only = true;
             return parseLine(line, stop, step, shape);
@@ -76,20 +74,17 @@ std::string parseLine(const std::string& line, size_t pos, Step& step, LineShape
         return braceOnly(line, stop, "}");
     }
     Parser parser = findCommand(word);
-    if (!parser) return "unknown command '" + (word.empty() ? line.substr(start, 1) : word) + "'";
+    if (!parser) refuse("unknown command '" + (word.empty() ? line.substr(start, 1) : word) + "'");
     shape.step = true;
     if (word == "echo") {  // takes the rest of its line as it is
         step.source = trimmed(line);
         step.command = Echo{line.substr(std::min(line.size(), stop + 1))};
-        return std::string();
+        return;
     }
-    std::vector<Token> tokens;
     size_t end = 0;
-    std::string error = lex(line, stop, tokens, &end);
-    if (!error.empty()) return error;
+    Operands operands(lex(line, stop, &end));
     step.source = trimmed(line.substr(0, end));
-    Operands operands(std::move(tokens));
-    return parser(operands, step.command);
+    step.command = parser(operands);
 }
 
 // An open `layer {` or `process32 {` block: where it began and which guard it puts on its lines.
@@ -98,15 +93,14 @@ struct Block {
     std::string guard;
 };
 
-// Opens or closes a block at a brace line; returns an error or "".
-std::string trackBlock(const LineShape& shape, int number, Block& block) {
+// Opens or closes a block at a brace line.
+void trackBlock(const LineShape& shape, int number, Block& block) {
     if (!shape.opens.empty() && block.line)
-        return "blocks do not nest (" + block.guard + " { is open since line " +
-               std::to_string(block.line) + ")";
+        refuse("blocks do not nest (" + block.guard + " { is open since line " +
+               std::to_string(block.line) + ")");
     if (!shape.opens.empty()) block = Block{number, shape.opens};
-    if (shape.closes && !block.line) return "} without layer { or process32 {";
+    if (shape.closes && !block.line) refuse("} without layer { or process32 {");
     if (shape.closes) block = Block();
-    return std::string();
 }
 
 }  // namespace
@@ -123,10 +117,11 @@ ParseResult parse(const std::string& file, const std::string& text) {
         Step step;
         step.line = number;
         LineShape shape;
-        std::string error = parseLine(line, 0, step, shape);
-        if (error.empty()) error = trackBlock(shape, number, block);
-        if (!error.empty()) {
-            result.error = file + ":" + std::to_string(number) + ": " + error;
+        try {
+            parseLine(line, 0, step, shape);
+            trackBlock(shape, number, block);
+        } catch (const Refusal& refusal) {
+            result.error = file + ":" + std::to_string(number) + ": " + refusal.what();
             return result;
         }
         if (!shape.step) continue;

@@ -55,93 +55,68 @@ void appendText(std::vector<uint8_t>& data, const std::u16string& text) {
 }
 
 // The type word of `bytes`: a name of TypeNames or a 32-bit number.
-std::string parseTypeWord(const std::string& word, uint32_t& type) {
+uint32_t parseTypeWord(const std::string& word) {
     for (const TypeName& t : TypeNames)
-        if (word == t.word) {
-            type = t.type;
-            return std::string();
-        }
+        if (word == t.word) return t.type;
     int64_t number = 0;
     if (word.empty() || !std::isdigit(static_cast<unsigned char>(word[0])) ||
         !parseInteger(word, number).empty())
-        return "unknown value type '" + word +
+        refuse("unknown value type '" + word +
                "' (none, sz, expand_sz, binary, dword, dword_be, link, multi_sz, qword or a "
-               "number)";
-    type = static_cast<uint32_t>(number);
-    return std::string();
+               "number)");
+    return static_cast<uint32_t>(number);
 }
 
-// sz and expand_sz take one text, multi_sz a list; each text is stored with its terminator.
-std::string parseTexts(Operands& in, const std::string& kind, Registry& reg) {
+// The data of a value: a type word and what that type takes. sz and expand_sz take one text,
+// multi_sz a list, each stored with its terminator; dword a 32-bit integer, qword a 64-bit one,
+// stored little-endian; binary hex bytes; bytes a type and hex bytes, for data no other form
+// writes.
+void parseData(Operands& in, Registry& reg) {
+    std::string kind = in.word();
     std::u16string text;
     if (kind == "multi_sz") {
         reg.type = REG_MULTI_SZ;
         while (in.text(text)) appendText(reg.data, text);
         appendText(reg.data, u"");  // the empty text that ends the list
-        return std::string();
+    } else if (kind == "sz" || kind == "expand_sz") {
+        reg.type = kind == "sz" ? REG_SZ : REG_EXPAND_SZ;
+        appendText(reg.data, in.text(kind + " needs one text in quotes"));
+    } else if (kind == "dword" || kind == "qword") {
+        std::string number = in.word();
+        if (number.empty()) refuse(kind + " needs an integer");
+        int bits = kind == "dword" ? 32 : 64;
+        uint64_t value = 0;
+        reg.type = bits == 32 ? REG_DWORD : REG_QWORD;
+        refuseIf(parseInteger(number, bits, value));
+        for (int i = 0; i < bits / 8; ++i) reg.data.push_back(static_cast<uint8_t>(value >> (8 * i)));
+    } else if (kind == "binary" || kind == "bytes") {
+        std::string type = kind == "bytes" ? in.word() : "binary";
+        if (type.empty()) refuse("bytes needs a value type and hex bytes in quotes");
+        reg.type = parseTypeWord(type);
+        reg.data = parseHex(in.text(kind + " needs hex bytes in quotes"));
+    } else {
+        refuse("reg " + formName(reg.form) + " needs " +
+               (reg.form == Form::ExpectValue ? "missing or " : "") +
+               "a value type: sz, expand_sz, multi_sz, dword, qword, binary or bytes" +
+               (kind.empty() ? std::string() : ", not '" + kind + "'"));
     }
-    if (!in.text(text)) return kind + " needs one text in quotes";
-    reg.type = kind == "sz" ? REG_SZ : REG_EXPAND_SZ;
-    appendText(reg.data, text);
-    return std::string();
-}
-
-// dword takes a 32-bit integer, qword a 64-bit one; both are stored little-endian.
-std::string parseNumber(Operands& in, const std::string& kind, Registry& reg) {
-    std::string number = in.word();
-    if (number.empty()) return kind + " needs an integer";
-    int bits = kind == "dword" ? 32 : 64;
-    uint64_t value = 0;
-    std::string error = parseInteger(number, bits, value);
-    reg.type = bits == 32 ? REG_DWORD : REG_QWORD;
-    for (int i = 0; i < bits / 8; ++i) reg.data.push_back(static_cast<uint8_t>(value >> (8 * i)));
-    return error;
-}
-
-// binary takes hex bytes; bytes takes a type and hex bytes, for data no other form writes.
-std::string parseBytes(Operands& in, const std::string& kind, Registry& reg) {
-    reg.type = REG_BINARY;
-    if (kind == "bytes") {
-        std::string type = in.word();
-        if (type.empty()) return "bytes needs a value type and hex bytes in quotes";
-        if (std::string error = parseTypeWord(type, reg.type); !error.empty()) return error;
-    }
-    std::u16string hex;
-    if (!in.text(hex)) return kind + " needs hex bytes in quotes";
-    return parseHex(hex, reg.data);
-}
-
-// The data of a value: a type word and what that type takes.
-std::string parseData(Operands& in, Registry& reg) {
-    std::string kind = in.word();
-    if (kind == "sz" || kind == "expand_sz" || kind == "multi_sz")
-        return parseTexts(in, kind, reg);
-    if (kind == "dword" || kind == "qword") return parseNumber(in, kind, reg);
-    if (kind == "binary" || kind == "bytes") return parseBytes(in, kind, reg);
-    return "reg " + formName(reg.form) + " needs " +
-           (reg.form == Form::ExpectValue ? "missing or " : "") +
-           "a value type: sz, expand_sz, multi_sz, dword, qword, binary or bytes" +
-           (kind.empty() ? std::string() : ", not '" + kind + "'");
 }
 
 // The forms after `reg`: "key create", "value set", "expect key" ...
-std::string parseForm(Operands& in, Form& form) {
+Form parseForm(Operands& in) {
     std::string first = in.word();
     if (first == "expect") {
         std::string what = in.word();
-        if (what != "key" && what != "value") return "reg expect takes key or value";
-        form = what == "key" ? Form::ExpectKey : Form::ExpectValue;
-        return std::string();
+        if (what != "key" && what != "value") refuse("reg expect takes key or value");
+        return what == "key" ? Form::ExpectKey : Form::ExpectValue;
     }
-    if (first != "key" && first != "value") return "reg takes key, value or expect";
+    if (first != "key" && first != "value") refuse("reg takes key, value or expect");
     std::string verb = in.word();
     const char* verbs = first == "key" ? "create" : "set";
-    if (verb != verbs && verb != "delete")
-        return "reg " + first + " takes " + verbs + " or delete";
+    if (verb != verbs && verb != "delete") refuse("reg " + first + " takes " + verbs + " or delete");
     bool remove = verb == "delete";
-    form = first == "key" ? (remove ? Form::DeleteKey : Form::CreateKey)
+    return first == "key" ? (remove ? Form::DeleteKey : Form::CreateKey)
                           : (remove ? Form::DeleteValue : Form::SetValue);
-    return std::string();
 }
 
 // The key as messages name it: HKEY_CURRENT_USER "Software\\X" view64.
@@ -156,10 +131,10 @@ std::string valueText(const Registry& reg) {
     return "value " + quote(reg.name) + " of " + keyText(reg.key);
 }
 
-// A registry call's failure, as a line reports it.
-std::string callFailed(const Registry& reg, const char* function, LONG code) {
-    return "reg " + formName(reg.form) + ": " + function + " gave " + std::to_string(code) +
-           " for " + keyText(reg.key);
+// Refuses with a registry call's failure, as a line reports it.
+[[noreturn]] void callFailed(const Registry& reg, const char* function, LONG code) {
+    refuse("reg " + formName(reg.form) + ": " + function + " gave " + std::to_string(code) +
+           " for " + keyText(reg.key));
 }
 
 // Opens the key in the line's view with `rights`: 0, 2 for a missing key, or another failure.
@@ -188,63 +163,58 @@ LONG deleteTree(HKEY parent, const std::u16string& path, REGSAM view, const char
 }
 
 // No rights are asked for: the line only makes sure that the key is there.
-std::string createKey(Session& session, const Step& step, const Registry& reg) {
+void createKey(Session& session, const Step& step, const Registry& reg) {
     HKEY key = nullptr;
     DWORD disposition = 0;
     LONG result = RegCreateKeyExW(rootKeyHandle(reg.key.root), wide(reg.key.path), 0, nullptr, 0,
                                   reg.key.view, nullptr, &key, &disposition);
-    if (result != ERROR_SUCCESS) return callFailed(reg, "RegCreateKeyExW", result);
+    if (result != ERROR_SUCCESS) callFailed(reg, "RegCreateKeyExW", result);
     RegCloseKey(key);
     session.show(step, disposition == REG_CREATED_NEW_KEY ? "created" : "was there");
-    return std::string();
 }
 
-std::string deleteKey(Session& session, const Step& step, const Registry& reg) {
+void deleteKey(Session& session, const Step& step, const Registry& reg) {
     HKEY key = nullptr;
     LONG result = openKey(reg.key, 0, &key);
     if (result == ERROR_FILE_NOT_FOUND) {
-        session.show(step, "was not there");
-        return std::string();
+        return session.show(step, "was not there");
     }
     if (result == ERROR_SUCCESS) RegCloseKey(key);
     const char* failed = "";
     result = deleteTree(rootKeyHandle(reg.key.root), reg.key.path, reg.key.view, &failed);
-    if (result != ERROR_SUCCESS) return callFailed(reg, failed, result);
+    if (result != ERROR_SUCCESS) callFailed(reg, failed, result);
     session.show(step, "deleted");
-    return std::string();
 }
 
 // Writes the value's bytes exactly: two nonzero bytes follow them in memory, since Windows adds
 // a terminator to a string whose size leaves it out when the next character happens to be zero.
-std::string setValue(Session& session, const Step& step, const Registry& reg) {
+void setValue(Session& session, const Step& step, const Registry& reg) {
     HKEY key = nullptr;
     LONG result = RegCreateKeyExW(rootKeyHandle(reg.key.root), wide(reg.key.path), 0, nullptr, 0,
                                   reg.key.view | KEY_SET_VALUE, nullptr, &key, nullptr);
-    if (result != ERROR_SUCCESS) return callFailed(reg, "RegCreateKeyExW", result);
+    if (result != ERROR_SUCCESS) callFailed(reg, "RegCreateKeyExW", result);
     std::vector<uint8_t> padded(reg.data);
     padded.insert(padded.end(), {0xFF, 0xFF, 0xFF});
     result = RegSetValueExW(key, wide(reg.name), 0, reg.type, padded.data(),
                             static_cast<DWORD>(reg.data.size()));
     RegCloseKey(key);
-    if (result != ERROR_SUCCESS) return callFailed(reg, "RegSetValueExW", result);
+    if (result != ERROR_SUCCESS) callFailed(reg, "RegSetValueExW", result);
     session.show(step, "written: " + typeName(reg.type) + ", " + std::to_string(reg.data.size()) +
                            " bytes");
-    return std::string();
 }
 
-std::string deleteValue(Session& session, const Step& step, const Registry& reg) {
+void deleteValue(Session& session, const Step& step, const Registry& reg) {
     HKEY key = nullptr;
     LONG result = openKey(reg.key, KEY_SET_VALUE, &key);
     if (result == ERROR_SUCCESS) {
         result = RegDeleteValueW(key, wide(reg.name));
         RegCloseKey(key);
         if (result != ERROR_SUCCESS && result != ERROR_FILE_NOT_FOUND)
-            return callFailed(reg, "RegDeleteValueW", result);
+            callFailed(reg, "RegDeleteValueW", result);
     } else if (result != ERROR_FILE_NOT_FOUND) {
-        return callFailed(reg, "RegOpenKeyExW", result);
+        callFailed(reg, "RegOpenKeyExW", result);
     }
     session.show(step, result == ERROR_SUCCESS ? "deleted" : "was not there");
-    return std::string();
 }
 
 // Why the key is not as expected, or "".
@@ -303,37 +273,32 @@ std::string valueWhy(const Registry& reg) {
 
 }  // namespace
 
-std::string parseRegistry(Operands& in, Command& command) {
+Command parseRegistry(Operands& in) {
     Registry reg;
     reg.key.view = takeView(in);
-    if (std::string error = parseForm(in, reg.form); !error.empty()) return error;
+    reg.form = parseForm(in);
     std::string form = "reg " + formName(reg.form);
     if (reg.form == Form::ExpectKey) {
         std::string state = in.word();
-        if (state != "exists" && state != "missing")
-            return "reg expect key takes exists or missing";
+        if (state != "exists" && state != "missing") refuse("reg expect key takes exists or missing");
         reg.exists = state == "exists";
     }
-    std::string usage = form + " needs a root key name (HKEY_CURRENT_USER ...)";
-    if (std::string error = parseRootName(in.peek(), usage, reg.key.root); !error.empty())
-        return error;
-    in.next();
-    if (!in.text(reg.key.path)) return form + " needs a key path in quotes";
-    bool value = reg.form == Form::SetValue || reg.form == Form::DeleteValue ||
-                 reg.form == Form::ExpectValue;
-    if (value && !in.text(reg.name)) return form + " needs a value name in quotes";
+    reg.key.root = parseRootName(in.next(), form + " needs a root key name (HKEY_CURRENT_USER ...)");
+    reg.key.path = in.text(form + " needs a key path in quotes");
+    if (reg.form == Form::SetValue || reg.form == Form::DeleteValue || reg.form == Form::ExpectValue)
+        reg.name = in.text(form + " needs a value name in quotes");
     const Token* t = in.peek();
     if (reg.form == Form::ExpectValue && t && !t->quoted && t->word == "missing") {
         in.word();
         reg.exists = false;
     } else if (reg.form == Form::ExpectValue || reg.form == Form::SetValue) {
-        if (std::string error = parseData(in, reg); !error.empty()) return error;
+        parseData(in, reg);
     }
-    command = std::move(reg);
-    return in.rest();
+    in.end();
+    return reg;
 }
 
-std::string run(Session& session, const Step& step, const Registry& reg) {
+void run(Session& session, const Step& step, const Registry& reg) {
     switch (reg.form) {
         case Form::CreateKey: return createKey(session, step, reg);
         case Form::DeleteKey: return deleteKey(session, step, reg);

@@ -39,10 +39,15 @@ void Session::skip(const Step& step, const std::string& why) {
     show(step, "skipped " + why);
 }
 
-std::string Session::checked(const Step& step, const std::string& why) {
+void Session::checked(const Step& step, const std::string& why) {
     ++expectations;
-    if (why.empty()) show(step, "ok");
-    return why;
+    refuseIf(why);
+    show(step, "ok");
+}
+
+const Outcome& Session::lastEvent() const {
+    if (!last_) refuse("expect with no event before it");
+    return *last_;
 }
 
 void Session::remember(EventKind kind, Outcome outcome) {
@@ -68,11 +73,11 @@ std::string layerSkipNote(const T&) {
 // A build without the layer skips the layer's own lines before they run, and has no run
 // functions for them.
 template <typename T>
-std::string runLine(Session& session, const Step& step, const T& line) {
+void runLine(Session& session, const Step& step, const T& line) {
     if constexpr (std::is_base_of_v<LayerControl, T> && !LayerBuilt)
-        return "this build has no portable layer";
+        refuse("this build has no portable layer");
     else
-        return run(session, step, line);
+        run(session, step, line);
 }
 
 }  // namespace
@@ -104,15 +109,10 @@ bool Runner::run(const Script& script) {
             session->skip(step, "under Windows: " + why);
             continue;
         }
-        std::string failure;
         try {
-            failure = std::visit([&](const auto& l) { return runLine(*session, step, l); },
-                                 step.command);
+            std::visit([&](const auto& l) { runLine(*session, step, l); }, step.command);
         } catch (const std::exception& e) {
-            failure = e.what();
-        }
-        if (!failure.empty()) {
-            session->fail(step, failure);
+            session->fail(step, e.what());
             undoLayer(*session);
             out_ << "== " << script.file << ": FAILED at line " << step.line << "\n\n";
             return false;
