@@ -414,17 +414,4 @@ void Instance::setHeaderFlags(uint16_t value) {
     writeAt(record_, hostLayout.headerFlags, value);
 }
 
-size_t Instance::rootKeyIndexOffset() {
-    return hostLayout.rootKeyIndex;
-}
-size_t Instance::currentKeyOffset() {
-    return hostLayout.currentKey;
-}
-size_t Instance::lastErrorOffset() {
-    return hostLayout.lastError;
-}
-size_t Instance::use64BitViewOffset() {
-    return hostLayout.use64BitView;
-}
-
 }  // namespace hv

@@ -186,13 +186,6 @@ public:
     // Host behaviour for the next events: lend no string buffer (GetStringBuffer gives null).
     void lendNoBuffer(bool on) { lendNoBuffer_ = on; }
 
-    // Byte offsets of the module's fields in this build's record.
-    static size_t rootKeyIndexOffset();
-    static size_t currentKeyOffset();
-    static size_t lastErrorOffset();
-    static size_t use64BitViewOffset();
-    static size_t headerFlagsOffset() { return 124; }
-
 private:
     friend struct Services;
     Module& module_;
@@ -250,7 +243,6 @@ private:
     friend struct EditorServices;
     std::vector<uint8_t> bytes_;
     uint32_t version_ = 0x02000100u | 242u;
-    bool present_ = true;
     unsigned hostVersionCalls_ = 0;
     std::vector<Insert> inserts_;
 };
