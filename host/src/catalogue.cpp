@@ -51,7 +51,9 @@ private:
     Guarded block_;
 };
 
-void readItems(HMENU menu, std::vector<MenuEntry>& items, int depth) {
+// Every item of `menu`, nested popups included.
+std::vector<MenuEntry> readMenu(HMENU menu, int depth = 0) {
+    std::vector<MenuEntry> items;
     WCHAR text[256];
     int count = GetMenuItemCount(menu);
     for (int position = 0; position < count; ++position) {
@@ -63,7 +65,7 @@ void readItems(HMENU menu, std::vector<MenuEntry>& items, int depth) {
         entry.text = fromWide(text);
         if (popup) {
             entry.kind = MenuEntry::Kind::Popup;
-            if (depth < 16) readItems(popup, entry.items, depth + 1);
+            if (depth < 16) entry.items = readMenu(popup, depth + 1);
         } else if (id == 0) {
             entry.kind = MenuEntry::Kind::Separator;
         } else {
@@ -72,25 +74,10 @@ void readItems(HMENU menu, std::vector<MenuEntry>& items, int depth) {
         }
         items.push_back(std::move(entry));
     }
-}
-
-}  // namespace
-
-std::vector<MenuEntry> readMenu(HMENU menu) {
-    std::vector<MenuEntry> items;
-    readItems(menu, items, 0);
     return items;
 }
 
-std::string paramTypeName(int16_t type) {
-    switch (type) {
-        case paramType::rootKey: return "root key";
-        case paramType::text: return "text";
-        case paramType::integer: return "integer";
-        case paramType::expressionText: return "text argument";
-        default: return "type " + std::to_string(type);
-    }
-}
+}  // namespace
 
 int Catalogue::eventCount(EventKind kind) {
     switch (kind) {
@@ -172,6 +159,14 @@ std::u16string Catalogue::expressionParam(int code, int index, int capacity) {
     return buffer.text();
 }
 
+std::vector<std::u16string> Catalogue::identity() {
+    TextBuffer name("GetObjInfos", 256), maker("GetObjInfos", 256), copyright("GetObjInfos", 256),
+        description("GetObjInfos", 1024), web("GetObjInfos", 256);
+    module_.entry<ObjInfosFn>("GetObjInfos")(0, 0, name.data(), maker.data(), copyright.data(),
+                                             description.data(), web.data());
+    return {name.text(), maker.text(), copyright.text(), description.text(), web.text()};
+}
+
 std::u16string Catalogue::parameterText(const Param& param) {
     switch (param.kind) {
         case Param::Kind::Text: return u"\"" + param.text + u"\"";
@@ -205,75 +200,13 @@ std::u16string Catalogue::sentence(EventKind kind, int code, const std::vector<P
             out += index < params.size() ? parameterText(params[index]) : u"%" + std::u16string(1, next);
             ++i;
         } else if (format[i] == u'%' && next == u'o') {
-            TextBuffer name("GetObjInfos", 255);
-            std::vector<WCHAR> scratch(4 * 1024 + 4);
-            module_.entry<ObjInfosFn>("GetObjInfos")(0, 0, name.data(), scratch.data(),
-                                                     scratch.data() + 1024,
-                                                     scratch.data() + 2048,
-                                                     scratch.data() + 3072);
-            out += name.text();
+            out += identity()[0];
             ++i;
         } else {
             out += format[i];
         }
     }
     return out;
-}
-
-namespace {
-
-void printItems(Catalogue& catalogue, EventKind kind, const std::vector<MenuEntry>& items,
-                int depth, std::ostream& out) {
-    std::string indent(2 * static_cast<size_t>(depth), ' ');
-    for (const MenuEntry& item : items) {
-        if (item.kind == MenuEntry::Kind::Separator) {
-            out << indent << "----\n";
-            continue;
-        }
-        if (item.kind == MenuEntry::Kind::Popup) {
-            out << indent << toUtf8(item.text) << " >\n";
-            printItems(catalogue, kind, item.items, depth + 1, out);
-            continue;
-        }
-        int code = catalogue.codeFromMenu(kind, item.id);
-        out << indent << toUtf8(item.text) << "  [" << item.id << "]";
-        std::optional<EventEntry> entry =
-            code >= 0 ? catalogue.entry(kind, code) : std::optional<EventEntry>();
-        if (!entry) {
-            out << "  no event (code " << code << ")\n";
-            continue;
-        }
-        const std::vector<std::string>& names = routineNames(kind);
-        out << "  code " << code << ' '
-            << (static_cast<size_t>(code) < names.size() ? names[static_cast<size_t>(code)] : "?")
-            << ", flags " << hex(static_cast<uint16_t>(entry->flags)) << ": \""
-            << toUtf8(catalogue.displayText(kind, code)) << "\"\n";
-        for (size_t i = 0; i < entry->types.size(); ++i) {
-            int index = static_cast<int>(i);
-            std::u16string title = kind == EventKind::Expression
-                                       ? catalogue.expressionParam(code, index)
-                                       : catalogue.title(kind, code, index);
-            out << indent << "    %" << i << " " << paramTypeName(entry->types[i]) << ": \""
-                << toUtf8(title) << "\"\n";
-        }
-    }
-}
-
-}  // namespace
-
-void printEditorView(Catalogue& catalogue, std::ostream& out) {
-    const std::pair<EventKind, const char*> menus[] = {{EventKind::Condition, "Conditions"},
-                                                       {EventKind::Action, "Actions"},
-                                                       {EventKind::Expression, "Expressions"}};
-    for (auto [kind, heading] : menus) {
-        out << heading << '\n';
-        std::optional<std::vector<MenuEntry>> items = catalogue.menuItems(kind);
-        if (!items) {
-            out << "  (the module gave no menu)\n";
-            continue;
-        }
-        printItems(catalogue, kind, *items, 1, out);
-    }
 }
 
 }  // namespace hv
