@@ -170,10 +170,9 @@ Instance::Instance(Module& module) : module_(module) {
                                  " bytes, less than the host's own header");
     // The accessors read the module's fields at their offsets even if the module asked for
     // too little: those bytes then lie in the guard, inside the allocation.
-    size_t span = std::max(recordSize_, hostLayout.recordSize);
-    storage_.assign(span + 2 * fill::guardSize, fill::guard);
-    record_ = storage_.data() + fill::guardSize;
-    std::memset(record_, fill::record, recordSize_);
+    size_t guard = fill::guardSize + std::max(recordSize_, hostLayout.recordSize) - recordSize_;
+    block_ = std::make_unique<Guarded>("record", recordSize_, fill::record, guard);
+    record_ = block_->data();
     layOutHeader();
     liveRecords()[record_] = this;
     create(record_, 0, 0);
@@ -355,16 +354,8 @@ void Instance::checkSentinels(Outcome& outcome) {
 // The guards around the record, the header bytes the module must leave alone, and the header
 // flags, of which the module may only set StringResultFlag.
 std::string Instance::damageToRecord() const {
-    long before = firstNotPattern(storage_.data(), fill::guard, fill::guardSize);
-    if (before >= 0)
-        return "record: byte " + std::to_string(fill::guardSize - before) +
-               " before its start was written";
-    size_t tail = storage_.size() - fill::guardSize - recordSize_;
-    long after = firstNotPattern(record_ + recordSize_, fill::guard, tail);
-    if (after >= 0)
-        return "record: byte " + std::to_string(recordSize_ + after) + ", past its " +
-               std::to_string(recordSize_) + " bytes, was written";
-    return damageToHeader();
+    std::string damage = block_->damage();
+    return damage.empty() ? damageToHeader() : damage;
 }
 
 // Header bytes compared with their state before the event; flags may only gain bits.
@@ -380,38 +371,6 @@ std::string Instance::damageToHeader() const {
     uint16_t cleared = readAt<uint16_t>(was.data(), flags) & ~headerFlags();
     if (cleared) return "record header: headerFlags bits " + hex(cleared) + " were cleared";
     return std::string();
-}
-
-uint32_t Instance::rootKeyIndex() const {
-    return readAt<uint32_t>(record_, hostLayout.rootKeyIndex);
-}
-
-const char16_t* Instance::currentKey() const {
-    return readAt<const char16_t*>(record_, hostLayout.currentKey);
-}
-
-uint32_t Instance::lastError() const {
-    return readAt<uint32_t>(record_, hostLayout.lastError);
-}
-
-uint32_t Instance::use64BitView() const {
-    return readAt<uint32_t>(record_, hostLayout.use64BitView);
-}
-
-uint16_t Instance::headerFlags() const {
-    return readAt<uint16_t>(record_, hostLayout.headerFlags);
-}
-
-void Instance::setRootKeyIndex(uint32_t value) {
-    writeAt(record_, hostLayout.rootKeyIndex, value);
-}
-
-void Instance::setLastError(uint32_t value) {
-    writeAt(record_, hostLayout.lastError, value);
-}
-
-void Instance::setHeaderFlags(uint16_t value) {
-    writeAt(record_, hostLayout.headerFlags, value);
 }
 
 }  // namespace hv
