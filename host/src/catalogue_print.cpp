@@ -125,13 +125,14 @@ void printEventJson(Catalogue& catalogue, EventKind kind, const MenuEntry& item,
                     std::vector<std::u16string> path, bool& first, std::ostream& out) {
     int code = 0;
     std::optional<MenuEvent> event = eventOf(catalogue, kind, item.id, code);
-    if (!event) throw std::runtime_error("menu item " + std::to_string(item.id) + " maps to no event");
+    if (!event)
+        throw std::runtime_error("menu item " + std::to_string(item.id) + " maps to no event");
     path.push_back(item.text);
     out << (first ? "" : ",\n") << "    {\"kind\": \"" << kindName(kind) << "\", \"code\": " << code
         << ", \"routine\": \"" << routineAt(kind, code) << "\", \"menuId\": " << item.id
-        << ", \"menu\": " << jsonList(path) << ", \"flags\": "
-        << static_cast<uint16_t>(event->entry.flags) << ", \"text\": " << json(event->text)
-        << ", \"params\": [";
+        << ", \"menu\": " << jsonList(path)
+        << ", \"flags\": " << static_cast<uint16_t>(event->entry.flags)
+        << ", \"text\": " << json(event->text) << ", \"params\": [";
     for (size_t i = 0; i < event->titles.size(); ++i)
         out << (i ? ", " : "") << "{\"type\": " << event->entry.types[i]
             << ", \"title\": " << json(event->titles[i]) << '}';
@@ -158,14 +159,16 @@ void printCatalogueJson(Module& module, Catalogue& catalogue, std::ostream& out)
     const char* const fields[] = {"name", "maker", "copyright", "description", "webAddress"};
     std::vector<std::u16string> identity = catalogue.identity();
     out << "{\n  \"object\": {";
-    for (size_t i = 0; i < 5; ++i) out << (i ? ", " : "") << '"' << fields[i] << "\": " << json(identity[i]);
-    out << "},\n  \"helpFile\": "
-        << json(fromWide(module.entry<HelpFileFn>("GetHelpFileName")())) << ",\n";
+    for (size_t i = 0; i < 5; ++i)
+        out << (i ? ", " : "") << '"' << fields[i] << "\": " << json(identity[i]);
+    out << "},\n  \"helpFile\": " << json(fromWide(module.entry<HelpFileFn>("GetHelpFileName")()))
+        << ",\n";
     out << "  \"events\": [\n";
     bool first = true;
     for (auto [kind, heading] : Menus) {
         std::optional<std::vector<MenuEntry>> items = catalogue.menuItems(kind);
-        if (!items) throw std::runtime_error(std::string("the module gave no ") + kindName(kind) + " menu");
+        if (!items)
+            throw std::runtime_error(std::string("the module gave no ") + kindName(kind) + " menu");
         std::vector<std::u16string> path;
         walk(*items, path, [&, k = kind](const MenuEntry& item, const auto& above) {
             if (item.kind == MenuEntry::Kind::Command)
@@ -179,7 +182,8 @@ void printCatalogueJson(Module& module, Catalogue& catalogue, std::ostream& out)
     for (size_t i = 0; i < std::size(OwnErrorCodes); ++i) {
         instance.setLastError(OwnErrorCodes[i]);
         Outcome outcome = instance.expression(message);
-        if (!outcome.clean() || !outcome.isText) throw std::runtime_error("RegErrText$( misbehaved");
+        if (!outcome.clean() || !outcome.isText)
+            throw std::runtime_error("RegErrText$( misbehaved");
         out << (i ? ", " : "") << "{\"code\": " << OwnErrorCodes[i]
             << ", \"text\": " << json(outcome.text) << '}';
     }

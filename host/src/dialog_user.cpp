@@ -105,7 +105,9 @@ void perform(User& user, HWND dialog, const UserStep& step) {
         case UserStep::Action::Enter: pressKey(dialog, VK_RETURN, 0x1C); break;
         case UserStep::Action::Escape: pressKey(dialog, VK_ESCAPE, 0x01); break;
         case UserStep::Action::CloseBox: PostMessageW(dialog, WM_SYSCOMMAND, SC_CLOSE, 0); break;
-        case UserStep::Action::Wait: user.idleTicks = step.index / static_cast<int>(TickPeriod); break;
+        case UserStep::Action::Wait:
+            user.idleTicks = step.index / static_cast<int>(TickPeriod);
+            break;
     }
 }
 

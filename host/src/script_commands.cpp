@@ -29,7 +29,8 @@ Event parseEvent(Operands& in, EventKind kind, const std::string& command) {
     int wanted = parameterCount(kind, event.code);
     int given = static_cast<int>(event.arguments.size());
     if (given != wanted)
-        refuse(routine + " takes " + plural(wanted, "parameter") + ", not " + std::to_string(given));
+        refuse(routine + " takes " + plural(wanted, "parameter") + ", not " +
+               std::to_string(given));
     return event;
 }
 
@@ -44,7 +45,8 @@ Command parseEventLine(Operands& in) {
 Command parseShow(Operands& in) {
     std::string word = in.word();
     for (int kind = 0; kind < 3; ++kind)
-        if (word == EventWords[kind]) return Show{parseEvent(in, static_cast<EventKind>(kind), "show")};
+        if (word == EventWords[kind])
+            return Show{parseEvent(in, static_cast<EventKind>(kind), "show")};
     refuse("show takes cnd, act or exp, a routine name and its parameters");
 }
 
@@ -52,6 +54,16 @@ Command parseShow(Operands& in) {
 void nothingAfter(const Operands& in, const std::string& command) {
     if (in.left() && in.peek()->quoted) refuse(command + " takes nothing after it");
     in.end();
+}
+
+Command parseNew(Operands& in) {
+    nothingAfter(in, "new");
+    return New{};
+}
+
+Command parseDebug(Operands& in) {
+    nothingAfter(in, "debug");
+    return Debug{};
 }
 
 // buffers on | off.
@@ -82,7 +94,7 @@ const std::pair<const char*, Parser> Commands[] = {
     {"exp", parseEventLine<EventKind::Expression>},
     {"expect", parseExpect},
     {"echo", [](Operands&) -> Command { return Echo{}; }},  // the parser reads its text
-    {"new", [](Operands& in) -> Command { nothingAfter(in, "new"); return New{}; }},
+    {"new", parseNew},
     {"buffers", parseBuffers},
     {"poke", parsePoke},
     {"reg", parseRegistry},
@@ -91,7 +103,7 @@ const std::pair<const char*, Parser> Commands[] = {
     {"save", [](Operands& in) -> Command { return parseStateFile(in, true); }},
     {"load", [](Operands& in) -> Command { return parseStateFile(in, false); }},
     {"file", [](Operands& in) -> Command { return parseFileBytes(in, false); }},
-    {"debug", [](Operands& in) -> Command { nothingAfter(in, "debug"); return Debug{}; }},
+    {"debug", parseDebug},
     {"param", parseParam},
 };
 

@@ -30,9 +30,10 @@ Command parseResult(Operands& in) {
     else if (parseInteger(t->word, n).empty())
         line.value = n;
     else
-        refuse("expect takes a text, an integer, true, false or one of: error, message, fetches, "
-               "buffers, address, rootKeyIndex, currentKey, use64BitView, debug, file; not '" +
-               t->word + "'");
+        refuse(
+            "expect takes a text, an integer, true, false or one of: error, message, fetches, "
+            "buffers, address, rootKeyIndex, currentKey, use64BitView, debug, file; not '" +
+            t->word + "'");
     return line;
 }
 
@@ -68,6 +69,12 @@ Command parseCurrentKey(Operands& in) {
     return line;
 }
 
+// expect sentence "text"
+Command parseSentence(Operands& in) {
+    if (in.left() != 1) refuse("expect sentence needs a text");
+    return ExpectSentence{in.text("expect sentence needs a text")};
+}
+
 // expect debug ITEM "text" | untouched
 Command parseDebug(Operands& in) {
     const Token* item = in.peek();
@@ -85,10 +92,7 @@ const std::pair<const char*, Parser> Subjects[] = {
     {"buffers", parseBuffers},
     {"address", parseAddress},
     {"currentKey", parseCurrentKey},
-    {"sentence", [](Operands& in) -> Command {
-         if (in.left() != 1) refuse("expect sentence needs a text");
-         return ExpectSentence{in.text("expect sentence needs a text")};
-     }},
+    {"sentence", parseSentence},
     {"debug", parseDebug},
     {"file", [](Operands& in) -> Command { return parseFileBytes(in, true); }},
 };
@@ -127,7 +131,8 @@ std::string numberWhy(const char* what, int64_t wanted, uint64_t actual) {
 // Integers compare at the width of the routine's result: 16 bits for actions, 32 otherwise.
 std::string resultWhy(Session& s, const ExpectResult& line) {
     const Outcome& o = s.lastEvent();
-    if (auto* text = std::get_if<std::u16string>(&line.value)) return textWhy(s, *text, quote(*text));
+    if (auto* text = std::get_if<std::u16string>(&line.value))
+        return textWhy(s, *text, quote(*text));
     if (auto* truth = std::get_if<bool>(&line.value)) {
         if (s.lastKind() == EventKind::Condition && o.asCondition() == (*truth ? 1 : 0)) return "";
         return std::string("expected ") + (*truth ? "true" : "false") + ", got " + got(s);
@@ -198,7 +203,8 @@ Command parseExpect(Operands& in) {
     for (auto [name, of] : Numbers)
         if (word == name) {
             in.word();
-            return ExpectNumber{of, oneInteger(in, "expect " + word, of == ExpectNumber::Of::Fetches)};
+            return ExpectNumber{of,
+                                oneInteger(in, "expect " + word, of == ExpectNumber::Of::Fetches)};
         }
     for (auto [name, parser] : Subjects)
         if (word == name) {
@@ -218,8 +224,9 @@ void run(Session& s, const Step& step, const ExpectNumber& line) {
 
 void run(Session& s, const Step& step, const ExpectBuffers& line) {
     const std::vector<size_t>& asked = s.lastEvent().bufferRequests;
-    s.checked(step, asked == line.sizes ? "" : "expected buffer requests " + listed(line.sizes) +
-                                                   ", got " + listed(asked));
+    s.checked(step, asked == line.sizes ? ""
+                                        : "expected buffer requests " + listed(line.sizes) +
+                                              ", got " + listed(asked));
 }
 
 void run(Session& s, const Step& step, const ExpectAddress& line) {
@@ -235,24 +242,27 @@ void run(Session& s, const Step& step, const ExpectAddress& line) {
 void run(Session& s, const Step& step, const ExpectCurrentKey& line) {
     const char16_t* key = s.instance().currentKey();
     bool same = line.key ? key && *line.key == key : key == nullptr;
-    s.checked(step, same ? "" : "expected currentKey " + (line.key ? quote(*line.key) : "null") +
-                                    ", got " + (key ? quote(key) : "null"));
+    s.checked(step, same ? ""
+                         : "expected currentKey " + (line.key ? quote(*line.key) : "null") +
+                               ", got " + (key ? quote(key) : "null"));
 }
 
 void run(Session& s, const Step& step, const ExpectSentence& line) {
     if (!s.sentence) refuse("expect sentence with no show line before it");
-    s.checked(step, *s.sentence == line.text ? "" : "expected the sentence " + quote(line.text) +
-                                                        ", got " + quote(*s.sentence));
+    s.checked(step, *s.sentence == line.text ? ""
+                                             : "expected the sentence " + quote(line.text) +
+                                                   ", got " + quote(*s.sentence));
 }
 
 void run(Session& s, const Step& step, const ExpectDebug& line) {
     Instance::DebugLine shown = s.instance().debugLine(line.item);
     if (!shown.sentinelsIntact) refuse("GetDebugItem wrote past the 256-character line");
     bool same = line.text ? lineIs(shown, *line.text) : !shown.written;
-    s.checked(step, same ? "" : "expected the debugger line " +
-                                    (line.text ? quote(*line.text) + " padded with zeros"
-                                               : "buffer untouched") +
-                                    ", got " + shownLine(shown));
+    s.checked(step, same ? ""
+                         : "expected the debugger line " +
+                               (line.text ? quote(*line.text) + " padded with zeros"
+                                          : "buffer untouched") +
+                               ", got " + shownLine(shown));
 }
 
 // debug: both lines of the debugger.

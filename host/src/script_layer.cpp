@@ -16,11 +16,10 @@ namespace {
 
 // The functions whose calls the layer can make fail.
 const char* const FailableFunctions[] = {
-    "RegOpenKeyExW",   "RegCreateKeyExW", "RegQueryValueExW", "RegSetValueExW",
-    "RegDeleteKeyW",   "RegDeleteKeyExW", "RegDeleteValueW",  "RegEnumKeyExW",
-    "RegCloseKey",     "GetVersionExW",   "LoadLibraryW",     "GetProcAddress",
-    "FormatMessageW",  "LoadStringW",     "calloc",           "malloc",
-    "ReadFile",        "WriteFile",       "DialogBoxParamW",
+    "RegOpenKeyExW",   "RegCreateKeyExW", "RegQueryValueExW", "RegSetValueExW",  "RegDeleteKeyW",
+    "RegDeleteKeyExW", "RegDeleteValueW", "RegEnumKeyExW",    "RegCloseKey",     "GetVersionExW",
+    "LoadLibraryW",    "GetProcAddress",  "FormatMessageW",   "LoadStringW",     "calloc",
+    "malloc",          "ReadFile",        "WriteFile",        "DialogBoxParamW",
 };
 
 // The access-mask argument of the calls that take one, by position in the journal.
@@ -84,8 +83,9 @@ Command parseVersion(Operands& in) {
     std::string how = in.word();
     if (how != "fail" && how != "normal" && how != "platform") refuse(usage);
     Version version;
-    version.how = how == "fail" ? Version::How::Fail : how == "normal" ? Version::How::Normal
-                                                                       : Version::How::Platform;
+    version.how = how == "fail"     ? Version::How::Fail
+                  : how == "normal" ? Version::How::Normal
+                                    : Version::How::Platform;
     if (how == "platform") version.platform = static_cast<uint32_t>(in.integer(usage));
     in.end();
     return version;
@@ -133,8 +133,9 @@ Command parseLayer(Operands& in) {
     const Token* next = in.peek(1);
     std::string verb = in.word();
     if (!isLayerVerb(verb, next && !next->quoted ? next->word : ""))
-        refuse("layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
-               "expect handles, expect calls");
+        refuse(
+            "layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
+            "expect handles, expect calls");
     if (verb == "deny") return parseDeny(in);
     if (verb == "fail") return parseFail(in);
     if (verb == "hide" || verb == "unhide") return parseHide(in, verb == "hide");
@@ -184,9 +185,10 @@ void run(Session& session, const Step& step, const Version& line) {
 
 void run(Session& session, const Step& step, const Handles& line) {
     size_t open = w32test::openHandleCount();
-    session.checked(step, open == line.count ? "" : "expected " + std::to_string(line.count) +
-                                                        " registry handles open, got " +
-                                                        std::to_string(open));
+    session.checked(step, open == line.count
+                              ? ""
+                              : "expected " + std::to_string(line.count) +
+                                    " registry handles open, got " + std::to_string(open));
 }
 
 // Counts the calls of the last event, or checks that every one carried the mask.

@@ -140,7 +140,8 @@ bool Operands::takeLast(const char* word) {
 }
 
 void Operands::end() const {
-    if (const Token* t = peek()) refuse("stray text '" + (t->quoted ? quote(t->text) : t->word) + "'");
+    if (const Token* t = peek())
+        refuse("stray text '" + (t->quoted ? quote(t->text) : t->word) + "'");
 }
 
 std::string parseInteger(const std::string& word, int bits, uint64_t& value) {
@@ -218,7 +219,8 @@ std::vector<uint8_t> parseHex(const std::u16string& text) {
     for (size_t i = 0; i < ascii.size(); ++i) {
         if (isBlank(ascii[i])) continue;
         if (i + 1 >= ascii.size() || !isHex(ascii[i]) || !isHex(ascii[i + 1]))
-            refuse("bad hex bytes '" + ascii + "' (pairs of hex digits, blanks only between bytes)");
+            refuse("bad hex bytes '" + ascii +
+                   "' (pairs of hex digits, blanks only between bytes)");
         data.push_back(static_cast<uint8_t>(std::stoul(ascii.substr(i++, 2), nullptr, 16)));
     }
     return data;

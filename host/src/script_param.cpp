@@ -72,11 +72,11 @@ const char* const ExpectUsage =
     "open yes|no..., ranout yes|no, text \"...\", untouched or bytes \"hex\"";
 
 const std::pair<const char*, ParamExpect::What> ExpectWords[] = {
-    {"index", ParamExpect::What::Index},     {"result", ParamExpect::What::Result},
+    {"index", ParamExpect::What::Index},         {"result", ParamExpect::What::Result},
     {"selection", ParamExpect::What::Selection}, {"items", ParamExpect::What::Items},
-    {"caption", ParamExpect::What::Caption}, {"text", ParamExpect::What::Text},
-    {"bytes", ParamExpect::What::Bytes},     {"open", ParamExpect::What::Open},
-    {"ranout", ParamExpect::What::RanOut},   {"untouched", ParamExpect::What::Untouched}};
+    {"caption", ParamExpect::What::Caption},     {"text", ParamExpect::What::Text},
+    {"bytes", ParamExpect::What::Bytes},         {"open", ParamExpect::What::Open},
+    {"ranout", ParamExpect::What::RanOut},       {"untouched", ParamExpect::What::Untouched}};
 
 // The operands of `param expect WHAT`, by the kind of value WHAT takes.
 void parseExpectOperands(Operands& in, const std::string& what, ParamExpect& line) {
@@ -158,14 +158,17 @@ std::string why(const ParamExpect& line, const ParamState& s) {
     switch (line.what) {
         case What::Index:
             return compare(param.rootIndex() == static_cast<uint32_t>(line.number),
-                           "the record's index ", std::to_string(static_cast<uint32_t>(line.number)),
-                           "got", std::to_string(param.rootIndex()));
+                           "the record's index ",
+                           std::to_string(static_cast<uint32_t>(line.number)), "got",
+                           std::to_string(param.rootIndex()));
         case What::Bytes:
             return compare(param.recordBytes() == line.bytes, "the record ", hexList(line.bytes),
                            "got", hexList(param.recordBytes()));
         case What::Text:
         case What::Untouched:
-            if (!s.copied) return "param expect " + whatWord(line.what) + " needs a param string line before it";
+            if (!s.copied)
+                return "param expect " + whatWord(line.what) +
+                       " needs a param string line before it";
             if (line.what == What::Untouched)
                 return compare(s.text.untouched, "the buffer ", "untouched", "got",
                                quote(s.text.text));
@@ -175,7 +178,8 @@ std::string why(const ParamExpect& line, const ParamState& s) {
                            quote(s.text.text));
         default: break;
     }
-    if (!s.edited) return "param expect " + whatWord(line.what) + " needs a param edit line before it";
+    if (!s.edited)
+        return "param expect " + whatWord(line.what) + " needs a param edit line before it";
     switch (line.what) {
         case What::Result:
             return compare(s.result == line.number, "the dialog's result ",
@@ -190,8 +194,9 @@ std::string why(const ParamExpect& line, const ParamState& s) {
             return compare(seen.items == line.texts, "the items ", texts(line.texts), "saw",
                            texts(seen.items));
         case What::Open:
-            return compare(seen.openAfter == line.flags, "open after each step: ",
-                           yesNo(line.flags), "got", yesNo(seen.openAfter));
+            return compare(seen.openAfter == line.flags,
+                           "open after each step: ", yesNo(line.flags), "got",
+                           yesNo(seen.openAfter));
         default:
             return seen.ranOut == line.flags[0]
                        ? std::string()

@@ -12,8 +12,8 @@ namespace {
 using Form = Registry::Form;
 
 // The forms as lines write them after `reg`, in the order of Registry::Form.
-const char* const FormNames[] = {"key create", "key delete", "value set", "value delete",
-                                 "expect key", "expect value"};
+const char* const FormNames[] = {"key create",   "key delete", "value set",
+                                 "value delete", "expect key", "expect value"};
 
 std::string formName(Form form) {
     return FormNames[static_cast<size_t>(form)];
@@ -88,7 +88,8 @@ void parseData(Operands& in, Registry& reg) {
         uint64_t value = 0;
         reg.type = bits == 32 ? REG_DWORD : REG_QWORD;
         refuseIf(parseInteger(number, bits, value));
-        for (int i = 0; i < bits / 8; ++i) reg.data.push_back(static_cast<uint8_t>(value >> (8 * i)));
+        for (int i = 0; i < bits / 8; ++i)
+            reg.data.push_back(static_cast<uint8_t>(value >> (8 * i)));
     } else if (kind == "binary" || kind == "bytes") {
         std::string type = kind == "bytes" ? in.word() : "binary";
         if (type.empty()) refuse("bytes needs a value type and hex bytes in quotes");
@@ -113,7 +114,8 @@ Form parseForm(Operands& in) {
     if (first != "key" && first != "value") refuse("reg takes key, value or expect");
     std::string verb = in.word();
     const char* verbs = first == "key" ? "create" : "set";
-    if (verb != verbs && verb != "delete") refuse("reg " + first + " takes " + verbs + " or delete");
+    if (verb != verbs && verb != "delete")
+        refuse("reg " + first + " takes " + verbs + " or delete");
     bool remove = verb == "delete";
     return first == "key" ? (remove ? Form::DeleteKey : Form::CreateKey)
                           : (remove ? Form::DeleteValue : Form::SetValue);
@@ -199,8 +201,8 @@ void setValue(Session& session, const Step& step, const Registry& reg) {
                             static_cast<DWORD>(reg.data.size()));
     RegCloseKey(key);
     if (result != ERROR_SUCCESS) callFailed(reg, "RegSetValueExW", result);
-    session.show(step, "written: " + typeName(reg.type) + ", " + std::to_string(reg.data.size()) +
-                           " bytes");
+    session.show(
+        step, "written: " + typeName(reg.type) + ", " + std::to_string(reg.data.size()) + " bytes");
 }
 
 void deleteValue(Session& session, const Step& step, const Registry& reg) {
@@ -265,7 +267,7 @@ std::string valueWhy(const Registry& reg) {
     bool found = result == ERROR_SUCCESS;
     if (reg.exists ? found && type == reg.type && data == reg.data : !found) return std::string();
     std::string wanted = reg.exists ? typeName(reg.type) + " " + hexList(reg.data) : "none";
-    std::string seen = found                                  ? typeName(type) + " " + hexList(data)
+    std::string seen = found ? typeName(type) + " " + hexList(data)
                        : std::string(failed) == "RegOpenKeyExW" ? "no key"
                                                                 : "no value";
     return "expected the " + valueText(reg) + " to be " + wanted + ", found " + seen;
@@ -280,12 +282,15 @@ Command parseRegistry(Operands& in) {
     std::string form = "reg " + formName(reg.form);
     if (reg.form == Form::ExpectKey) {
         std::string state = in.word();
-        if (state != "exists" && state != "missing") refuse("reg expect key takes exists or missing");
+        if (state != "exists" && state != "missing")
+            refuse("reg expect key takes exists or missing");
         reg.exists = state == "exists";
     }
-    reg.key.root = parseRootName(in.next(), form + " needs a root key name (HKEY_CURRENT_USER ...)");
+    reg.key.root =
+        parseRootName(in.next(), form + " needs a root key name (HKEY_CURRENT_USER ...)");
     reg.key.path = in.text(form + " needs a key path in quotes");
-    if (reg.form == Form::SetValue || reg.form == Form::DeleteValue || reg.form == Form::ExpectValue)
+    if (reg.form == Form::SetValue || reg.form == Form::DeleteValue ||
+        reg.form == Form::ExpectValue)
         reg.name = in.text(form + " needs a value name in quotes");
     const Token* t = in.peek();
     if (reg.form == Form::ExpectValue && t && !t->quoted && t->word == "missing") {

@@ -105,7 +105,8 @@ bool Runner::run(const Script& script) {
             continue;
         }
         if (step.layerOnly && !layer_) {
-            std::string why = std::visit([](const auto& l) { return layerSkipNote(l); }, step.command);
+            std::string why =
+                std::visit([](const auto& l) { return layerSkipNote(l); }, step.command);
             session->skip(step, "under Windows: " + why);
             continue;
         }

@@ -27,8 +27,8 @@ FileBytes parseFileBytes(Operands& in, bool check) {
 void run(Session& session, const Step& step, const StateFile& line) {
     std::string error;
     Instance& instance = session.instance();
-    int result = line.save ? instance.saveState(line.path, &error)
-                           : instance.loadState(line.path, &error);
+    int result =
+        line.save ? instance.saveState(line.path, &error) : instance.loadState(line.path, &error);
     if (result < 0) refuse(error);
     ++session.events;
     session.show(step, "=> " + std::to_string(result) + "   (lastError " +
@@ -44,9 +44,10 @@ void run(Session& session, const Step& step, const FileBytes& line) {
         std::vector<uint8_t> bytes((std::istreambuf_iterator<char>(in)),
                                    std::istreambuf_iterator<char>());
         if (!in) refuse("cannot read " + line.path);
-        return session.checked(step, bytes == line.bytes ? "" : "expected " + line.path +
-                                                                    " to hold " + hexList(line.bytes) +
-                                                                    ", it holds " + hexList(bytes));
+        return session.checked(step, bytes == line.bytes ? ""
+                                                         : "expected " + line.path + " to hold " +
+                                                               hexList(line.bytes) + ", it holds " +
+                                                               hexList(bytes));
     }
     std::ofstream out(line.path, std::ios::binary | std::ios::trunc);
     out.write(reinterpret_cast<const char*>(line.bytes.data()),

@@ -100,10 +100,11 @@ TEST(ScriptParser, ExpectationForms) {
     EXPECT_EQ(std::get<int64_t>(as<ExpectResult>(s[1]).value), 5);
     EXPECT_TRUE(std::get<bool>(as<ExpectResult>(s[2]).value));
     EXPECT_FALSE(std::get<bool>(as<ExpectResult>(s[3]).value));
-    const std::pair<size_t, ExpectNumber::Of> numbers[] = {
-        {4, ExpectNumber::Of::LastError},     {5, ExpectNumber::Of::Message},
-        {6, ExpectNumber::Of::Fetches},       {10, ExpectNumber::Of::RootKeyIndex},
-        {13, ExpectNumber::Of::Use64BitView}};
+    const std::pair<size_t, ExpectNumber::Of> numbers[] = {{4, ExpectNumber::Of::LastError},
+                                                           {5, ExpectNumber::Of::Message},
+                                                           {6, ExpectNumber::Of::Fetches},
+                                                           {10, ExpectNumber::Of::RootKeyIndex},
+                                                           {13, ExpectNumber::Of::Use64BitView}};
     for (auto [index, of] : numbers) EXPECT_EQ(as<ExpectNumber>(s[index]).of, of) << index;
     EXPECT_EQ(as<ExpectNumber>(s[4]).value, 40);
     EXPECT_TRUE(as<ExpectBuffers>(s[7]).sizes.empty());
@@ -170,11 +171,13 @@ TEST(ScriptParser, RegistryValueData) {
     };
     for (const Row& row : table) {
         SCOPED_TRACE(row.data);
-        Registry set = as<Registry>(only(std::string("reg value set HKEY_USERS \"k\" \"v\" ") + row.data));
+        Registry set =
+            as<Registry>(only(std::string("reg value set HKEY_USERS \"k\" \"v\" ") + row.data));
         EXPECT_EQ(set.form, Registry::Form::SetValue);
         EXPECT_EQ(set.type, row.type);
         EXPECT_EQ(set.data, row.bytes);
-        Registry e = as<Registry>(only(std::string("reg expect value HKEY_USERS \"k\" \"v\" ") + row.data));
+        Registry e =
+            as<Registry>(only(std::string("reg expect value HKEY_USERS \"k\" \"v\" ") + row.data));
         EXPECT_TRUE(e.exists);
         EXPECT_EQ(e.data, row.bytes);
     }
@@ -297,7 +300,7 @@ TEST(ScriptParser, ParamLines) {
     ASSERT_EQ(s.size(), 8u);
     using Action = hv::UserStep::Action;
     const std::pair<Action, int> edit[] = {
-        {Action::Select, 4}, {Action::DoubleClick, 1}, {Action::Wait, 50}, {Action::Ok, 0},
+        {Action::Select, 4}, {Action::DoubleClick, 1}, {Action::Wait, 50},  {Action::Ok, 0},
         {Action::Cancel, 0}, {Action::Enter, 0},       {Action::Escape, 0}, {Action::CloseBox, 0}};
     std::vector<hv::UserStep> steps = as<ParamEdit>(s[0]).steps;
     ASSERT_EQ(steps.size(), std::size(edit));
@@ -441,10 +444,12 @@ const Malformed MalformedLines[] = {
      "reg expect value needs missing or a value type: sz, expand_sz, multi_sz, dword, qword, "
      "binary or bytes"},
     {"reg expect value HKEY_USERS \"k\" \"v\" missing now", "stray text 'now'"},
-    {"layer", "layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
-              "expect handles, expect calls"},
-    {"layer # nothing", "layer needs a command, {, or one of: deny, fail, hide, unhide, version, "
-                        "clear, expect handles, expect calls"},
+    {"layer",
+     "layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
+     "expect handles, expect calls"},
+    {"layer # nothing",
+     "layer needs a command, {, or one of: deny, fail, hide, unhide, version, "
+     "clear, expect handles, expect calls"},
     {"layer layer new", "layer is written once"},
     {"layer }", "} stands alone on its line"},
     {"layer frob", "unknown command 'frob'"},
@@ -478,12 +483,14 @@ const Malformed MalformedLines[] = {
     {"layer expect calls RegOpenKeyExW -1",
      "layer expect calls takes a function and a count, or mask and a mask"},
     {"layer expect calls RegCloseKey mask 1", "RegCloseKey takes no access mask"},
-    {"layer expect calls RegOpenKeyExW mask", "layer expect calls takes a function and a count, or "
-                                              "mask and a mask"},
+    {"layer expect calls RegOpenKeyExW mask",
+     "layer expect calls takes a function and a count, or "
+     "mask and a mask"},
     {"layer expect calls RegOpenKeyExW 1 2", "stray text '2'"},
-    {"layer expect nothing", "expect takes a text, an integer, true, false or one of: error, "
-                               "message, fetches, buffers, address, rootKeyIndex, currentKey, "
-                               "use64BitView, debug, file; not 'nothing'"},
+    {"layer expect nothing",
+     "expect takes a text, an integer, true, false or one of: error, "
+     "message, fetches, buffers, address, rootKeyIndex, currentKey, "
+     "use64BitView, debug, file; not 'nothing'"},
     {"}", "} without layer { or process32 {"},
     {"layer deny HKEY_NOWHERE \"k\" 1", "unknown root key name 'HKEY_NOWHERE'"},
     {"param", "param takes init, record, fill, edit, string or expect"},
@@ -494,8 +501,9 @@ const Malformed MalformedLines[] = {
     {"param edit select", "select needs a list position"},
     {"param edit wait x", "bad integer 'x'"},
     {"param edit \"ok\"", "a dialog step is a word, not \"ok\""},
-    {"param edit ok frob", "unknown dialog step 'frob' (select N, double N, ok, cancel, enter, "
-                           "escape, close or wait MS)"},
+    {"param edit ok frob",
+     "unknown dialog step 'frob' (select N, double N, ok, cancel, enter, "
+     "escape, close or wait MS)"},
     {"param expect open yes maybe", "open takes yes or no"},
     {"param expect items \"a\" b", "items takes texts in quotes"},
     {"param expect bytes \"0 1\"",

@@ -190,7 +190,18 @@ struct ParamString {
 
 // param expect ...: what the last param edit or param string left.
 struct ParamExpect {
-    enum class What { Index, Bytes, Result, Selection, Items, Caption, Open, RanOut, Text, Untouched };
+    enum class What {
+        Index,
+        Bytes,
+        Result,
+        Selection,
+        Items,
+        Caption,
+        Open,
+        RanOut,
+        Text,
+        Untouched
+    };
     What what = What::Index;
     int64_t number = 0;                 // index, result, selection (LB_ERR: none)
     std::vector<uint8_t> bytes;         // bytes
