@@ -19,22 +19,18 @@ typedef void(WINAPI* TitleFn)(void*, Slot, Slot, LPWSTR, Slot);
 typedef void(WINAPI* ExpressionTitleFn)(void*, Slot, LPWSTR, Slot);
 typedef void(WINAPI* ObjInfosFn)(Slot, Slot, LPWSTR, LPWSTR, LPWSTR, LPWSTR, LPWSTR);
 
-// Export names by kind: condition, action, expression.
-const char* exportName(EventKind kind, const char* condition, const char* action,
-                       const char* expression) {
-    switch (kind) {
-        case EventKind::Condition: return condition;
-        case EventKind::Action: return action;
-        default: return expression;
-    }
+// The entry point Get<Kind><what>: GetConditionMenu, GetActionInfos, GetExpressionString ...
+std::string exportName(EventKind kind, const char* what) {
+    const char* const kinds[] = {"Condition", "Action", "Expression"};
+    return std::string("Get") + kinds[static_cast<int>(kind)] + what;
 }
 
 // A buffer of `capacity` characters lent to one entry point: it starts empty, and after the
 // call its guards are checked.
 class TextBuffer {
 public:
-    TextBuffer(const char* entryPoint, int capacity)
-        : block_(std::string(entryPoint) + "'s buffer",
+    TextBuffer(const std::string& entryPoint, int capacity)
+        : block_(entryPoint + "'s buffer",
                  2 * static_cast<size_t>(capacity > 0 ? capacity : 0) + 2, 0) {}
     LPWSTR data() { return reinterpret_cast<LPWSTR>(block_.data()); }
     // The text up to its terminator (or the capacity, if the module left none).
@@ -88,8 +84,7 @@ int Catalogue::eventCount(EventKind kind) {
 }
 
 HMENU Catalogue::menu(EventKind kind) {
-    auto fn = module_.entry<MenuFn>(
-        exportName(kind, "GetConditionMenu", "GetActionMenu", "GetExpressionMenu"));
+    auto fn = module_.entry<MenuFn>(exportName(kind, "Menu").c_str());
     return fn(editor_.structure(), 0, 0);
 }
 
@@ -102,15 +97,12 @@ std::optional<std::vector<MenuEntry>> Catalogue::menuItems(EventKind kind) {
 }
 
 int Catalogue::codeFromMenu(EventKind kind, uint32_t id) {
-    auto fn = module_.entry<CodeFn>(exportName(kind, "GetConditionCodeFromMenu",
-                                               "GetActionCodeFromMenu",
-                                               "GetExpressionCodeFromMenu"));
+    auto fn = module_.entry<CodeFn>(exportName(kind, "CodeFromMenu").c_str());
     return fn(editor_.structure(), static_cast<Slot>(id));
 }
 
 const int16_t* Catalogue::infos(EventKind kind, int code) {
-    auto fn = module_.entry<InfosFn>(
-        exportName(kind, "GetConditionInfos", "GetActionInfos", "GetExpressionInfos"));
+    auto fn = module_.entry<InfosFn>(exportName(kind, "Infos").c_str());
     return fn(editor_.structure(), code);
 }
 
@@ -131,10 +123,9 @@ std::optional<EventEntry> Catalogue::entry(EventKind kind, int code) {
 }
 
 std::u16string Catalogue::displayText(EventKind kind, int code, int capacity) {
-    const char* name =
-        exportName(kind, "GetConditionString", "GetActionString", "GetExpressionString");
+    std::string name = exportName(kind, "String");
     TextBuffer buffer(name, capacity);
-    module_.entry<StringFn>(name)(editor_.structure(), code, buffer.data(), capacity);
+    module_.entry<StringFn>(name.c_str())(editor_.structure(), code, buffer.data(), capacity);
     return buffer.text();
 }
 
@@ -146,9 +137,9 @@ std::u16string Catalogue::title(EventKind kind, int code, int index, int capacit
                                                                buffer.data(), capacity);
         return buffer.text();
     }
-    const char* name = exportName(kind, "GetConditionTitle", "GetActionTitle", "");
+    std::string name = exportName(kind, "Title");
     TextBuffer buffer(name, capacity);
-    module_.entry<TitleFn>(name)(editor_.structure(), code, index, buffer.data(), capacity);
+    module_.entry<TitleFn>(name.c_str())(editor_.structure(), code, index, buffer.data(), capacity);
     return buffer.text();
 }
 

@@ -93,7 +93,6 @@ const std::pair<const char*, Parser> Commands[] = {
     {"act", parseEventLine<EventKind::Action>},
     {"exp", parseEventLine<EventKind::Expression>},
     {"expect", parseExpect},
-    {"echo", [](Operands&) -> Command { return Echo{}; }},  // the parser reads its text
     {"new", parseNew},
     {"buffers", parseBuffers},
     {"poke", parsePoke},

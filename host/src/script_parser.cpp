@@ -73,14 +73,14 @@ void parseLine(const std::string& line, size_t pos, Step& step, LineShape& shape
         shape.closes = true;
         return braceOnly(line, stop, "}");
     }
-    Parser parser = findCommand(word);
-    if (!parser) refuse("unknown command '" + (word.empty() ? line.substr(start, 1) : word) + "'");
     shape.step = true;
     if (word == "echo") {  // takes the rest of its line as it is
         step.source = trimmed(line);
         step.command = Echo{line.substr(std::min(line.size(), stop + 1))};
         return;
     }
+    Parser parser = findCommand(word);
+    if (!parser) refuse("unknown command '" + (word.empty() ? line.substr(start, 1) : word) + "'");
     size_t end = 0;
     Operands operands(lex(line, stop, &end));
     step.source = trimmed(line.substr(0, end));
