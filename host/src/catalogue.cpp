@@ -75,14 +75,6 @@ std::vector<MenuEntry> readMenu(HMENU menu, int depth = 0) {
 
 }  // namespace
 
-int Catalogue::eventCount(EventKind kind) {
-    switch (kind) {
-        case EventKind::Condition: return 5;
-        case EventKind::Action: return 13;
-        default: return 8;
-    }
-}
-
 HMENU Catalogue::menu(EventKind kind) {
     auto fn = module_.entry<MenuFn>(exportName(kind, "Menu").c_str());
     return fn(editor_.structure(), 0, 0);

@@ -43,9 +43,6 @@ class Catalogue {
 public:
     Catalogue(Module& module, Editor& editor) : module_(module), editor_(editor) {}
 
-    // Events of each kind: 5 conditions, 13 actions, 8 expressions.
-    static int eventCount(EventKind kind);
-
     // The Menu entry point's popup; the caller destroys it. Null when the module gave none.
     HMENU menu(EventKind kind);
     // The menu's items, the popup destroyed afterwards; nullopt when the module gave no menu.
