@@ -112,38 +112,31 @@ struct Services {
     }
 
     // Both expression-parameter services take the same constant and the routine's host value.
-    static EventState* expressionEvent(void* record, int one, Slot hostValue, const char* service) {
-        Instance* self = owner(record, service);
-        if (!self) return nullptr;
+    static Slot expressionParameter(void* record, int one, Slot hostValue, bool first) {
+        std::string name = first ? "GetFirstExpressionParameter" : "GetNextExpressionParameter";
+        Instance* self = owner(record, name.c_str());
+        if (!self) return 0;
         EventState& e = *self->event_;
         ++e.outcome->expressionFetches;
-        std::string name = service;
         if (e.kind != EventKind::Expression) e.note(name + " called by " + withArticle(e.kind));
         if (one != 1) e.note(name + ": second argument " + std::to_string(one) + ", not 1");
         if (hostValue != e.hostValue)
             e.note(name + ": host value " + hex(static_cast<uint64_t>(hostValue)) +
                    ", not the expression's " + hex(static_cast<uint64_t>(e.hostValue)));
-        return &e;
+        if (first && e.firstExpressionAsked) e.note(name + " called again");
+        if (!first && !e.firstExpressionAsked)
+            e.note(name + " called before GetFirstExpressionParameter");
+        e.firstExpressionAsked = true;
+        if (first) e.nextExpressionParameter = 0;
+        return e.take(e.nextExpressionParameter++, name.c_str());
     }
 
     static Slot WINAPI firstExpressionParameter(void* record, int one, Slot hostValue) {
-        const char* name = "GetFirstExpressionParameter";
-        EventState* e = expressionEvent(record, one, hostValue, name);
-        if (!e) return 0;
-        if (e->firstExpressionAsked) e->note("GetFirstExpressionParameter called again");
-        e->firstExpressionAsked = true;
-        e->nextExpressionParameter = 1;
-        return e->take(0, name);
+        return expressionParameter(record, one, hostValue, true);
     }
 
     static Slot WINAPI nextExpressionParameter(void* record, int one, Slot hostValue) {
-        const char* name = "GetNextExpressionParameter";
-        EventState* e = expressionEvent(record, one, hostValue, name);
-        if (!e) return 0;
-        if (!e->firstExpressionAsked)
-            e->note("GetNextExpressionParameter called before GetFirstExpressionParameter");
-        e->firstExpressionAsked = true;
-        return e->take(e->nextExpressionParameter++, name);
+        return expressionParameter(record, one, hostValue, false);
     }
 
     static Slot WINAPI getNextParameter(void* record, int allBits, int zero) {

@@ -1,5 +1,6 @@
 // The host's side of an instance's saved state and debugger lines, and the reader of state
 // files that hivelet-host dump-state uses.
+#include <algorithm>
 #include <atomic>
 #include <filesystem>
 #include <fstream>
@@ -82,12 +83,7 @@ int Instance::loadState(const std::vector<uint8_t>& bytes) {
 }
 
 std::u16string Instance::DebugLine::text() const {
-    std::u16string t;
-    for (char16_t c : buffer) {
-        if (c == 0) break;
-        t += c;
-    }
-    return t;
+    return std::u16string(buffer.begin(), std::find(buffer.begin(), buffer.end(), u'\0'));
 }
 
 Instance::DebugLine Instance::debugLine(int item) {
