@@ -12,7 +12,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     hv::script::ParseResult result = hv::script::parse("fuzz.hvs", text);
     if (!result.ok() && result.error.rfind("fuzz.hvs:", 0) != 0) __builtin_trap();
     for (const hv::script::Step& step : result.script.steps)
-        for (const hv::script::Value& value : step.values)
-            if (value.kind == hv::script::Value::Kind::Text) (void)hv::script::quote(value.text);
+        if (const auto* event = std::get_if<hv::script::Event>(&step.command))
+            for (const hv::script::Argument& argument : event->arguments)
+                (void)hv::script::quote(argument.value.text);
     return 0;
 }

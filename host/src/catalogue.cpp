@@ -19,22 +19,18 @@ typedef void(WINAPI* TitleFn)(void*, Slot, Slot, LPWSTR, Slot);
 typedef void(WINAPI* ExpressionTitleFn)(void*, Slot, LPWSTR, Slot);
 typedef void(WINAPI* ObjInfosFn)(Slot, Slot, LPWSTR, LPWSTR, LPWSTR, LPWSTR, LPWSTR);
 
-// Export names by kind: condition, action, expression.
-const char* exportName(EventKind kind, const char* condition, const char* action,
-                       const char* expression) {
-    switch (kind) {
-        case EventKind::Condition: return condition;
-        case EventKind::Action: return action;
-        default: return expression;
-    }
+// The entry point Get<Kind><what>: GetConditionMenu, GetActionInfos, GetExpressionString ...
+std::string exportName(EventKind kind, const char* what) {
+    const char* const kinds[] = {"Condition", "Action", "Expression"};
+    return std::string("Get") + kinds[static_cast<int>(kind)] + what;
 }
 
 // A buffer of `capacity` characters lent to one entry point: it starts empty, and after the
 // call its guards are checked.
 class TextBuffer {
 public:
-    TextBuffer(const char* entryPoint, int capacity)
-        : block_(std::string(entryPoint) + "'s buffer",
+    TextBuffer(const std::string& entryPoint, int capacity)
+        : block_(entryPoint + "'s buffer",
                  2 * static_cast<size_t>(capacity > 0 ? capacity : 0) + 2, 0) {}
     LPWSTR data() { return reinterpret_cast<LPWSTR>(block_.data()); }
     // The text up to its terminator (or the capacity, if the module left none).
@@ -51,7 +47,9 @@ private:
     Guarded block_;
 };
 
-void readItems(HMENU menu, std::vector<MenuEntry>& items, int depth) {
+// Every item of `menu`, nested popups included.
+std::vector<MenuEntry> readMenu(HMENU menu, int depth = 0) {
+    std::vector<MenuEntry> items;
     WCHAR text[256];
     int count = GetMenuItemCount(menu);
     for (int position = 0; position < count; ++position) {
@@ -63,7 +61,7 @@ void readItems(HMENU menu, std::vector<MenuEntry>& items, int depth) {
         entry.text = fromWide(text);
         if (popup) {
             entry.kind = MenuEntry::Kind::Popup;
-            if (depth < 16) readItems(popup, entry.items, depth + 1);
+            if (depth < 16) entry.items = readMenu(popup, depth + 1);
         } else if (id == 0) {
             entry.kind = MenuEntry::Kind::Separator;
         } else {
@@ -72,33 +70,13 @@ void readItems(HMENU menu, std::vector<MenuEntry>& items, int depth) {
         }
         items.push_back(std::move(entry));
     }
+    return items;
 }
 
 }  // namespace
 
-std::vector<MenuEntry> readMenu(HMENU menu) {
-    std::vector<MenuEntry> items;
-    readItems(menu, items, 0);
-    return items;
-}
-
-std::string paramTypeName(int16_t type) {
-    switch (type) {
-        case paramType::rootKey: return "root key";
-        case paramType::text: return "text";
-        case paramType::integer: return "integer";
-        case paramType::expressionText: return "text argument";
-        default: return "type " + std::to_string(type);
-    }
-}
-
-int Catalogue::eventCount(EventKind kind) {
-    return static_cast<int>(routineNames(kind).size());
-}
-
 HMENU Catalogue::menu(EventKind kind) {
-    auto fn = module_.entry<MenuFn>(
-        exportName(kind, "GetConditionMenu", "GetActionMenu", "GetExpressionMenu"));
+    auto fn = module_.entry<MenuFn>(exportName(kind, "Menu").c_str());
     return fn(editor_.structure(), 0, 0);
 }
 
@@ -111,15 +89,12 @@ std::optional<std::vector<MenuEntry>> Catalogue::menuItems(EventKind kind) {
 }
 
 int Catalogue::codeFromMenu(EventKind kind, uint32_t id) {
-    auto fn = module_.entry<CodeFn>(exportName(kind, "GetConditionCodeFromMenu",
-                                               "GetActionCodeFromMenu",
-                                               "GetExpressionCodeFromMenu"));
+    auto fn = module_.entry<CodeFn>(exportName(kind, "CodeFromMenu").c_str());
     return fn(editor_.structure(), static_cast<Slot>(id));
 }
 
 const int16_t* Catalogue::infos(EventKind kind, int code) {
-    auto fn = module_.entry<InfosFn>(
-        exportName(kind, "GetConditionInfos", "GetActionInfos", "GetExpressionInfos"));
+    auto fn = module_.entry<InfosFn>(exportName(kind, "Infos").c_str());
     return fn(editor_.structure(), code);
 }
 
@@ -140,10 +115,9 @@ std::optional<EventEntry> Catalogue::entry(EventKind kind, int code) {
 }
 
 std::u16string Catalogue::displayText(EventKind kind, int code, int capacity) {
-    const char* name =
-        exportName(kind, "GetConditionString", "GetActionString", "GetExpressionString");
+    std::string name = exportName(kind, "String");
     TextBuffer buffer(name, capacity);
-    module_.entry<StringFn>(name)(editor_.structure(), code, buffer.data(), capacity);
+    module_.entry<StringFn>(name.c_str())(editor_.structure(), code, buffer.data(), capacity);
     return buffer.text();
 }
 
@@ -155,9 +129,9 @@ std::u16string Catalogue::title(EventKind kind, int code, int index, int capacit
                                                                buffer.data(), capacity);
         return buffer.text();
     }
-    const char* name = exportName(kind, "GetConditionTitle", "GetActionTitle", "");
+    std::string name = exportName(kind, "Title");
     TextBuffer buffer(name, capacity);
-    module_.entry<TitleFn>(name)(editor_.structure(), code, index, buffer.data(), capacity);
+    module_.entry<TitleFn>(name.c_str())(editor_.structure(), code, index, buffer.data(), capacity);
     return buffer.text();
 }
 
@@ -166,6 +140,14 @@ std::u16string Catalogue::expressionParam(int code, int index, int capacity) {
     module_.entry<TitleFn>("GetExpressionParam")(editor_.structure(), code, index, buffer.data(),
                                                  capacity);
     return buffer.text();
+}
+
+std::vector<std::u16string> Catalogue::identity() {
+    TextBuffer name("GetObjInfos", 256), maker("GetObjInfos", 256), copyright("GetObjInfos", 256),
+        description("GetObjInfos", 1024), web("GetObjInfos", 256);
+    module_.entry<ObjInfosFn>("GetObjInfos")(0, 0, name.data(), maker.data(), copyright.data(),
+                                             description.data(), web.data());
+    return {name.text(), maker.text(), copyright.text(), description.text(), web.text()};
 }
 
 std::u16string Catalogue::parameterText(const Param& param) {
@@ -201,75 +183,13 @@ std::u16string Catalogue::sentence(EventKind kind, int code, const std::vector<P
             out += index < params.size() ? parameterText(params[index]) : u"%" + std::u16string(1, next);
             ++i;
         } else if (format[i] == u'%' && next == u'o') {
-            TextBuffer name("GetObjInfos", 255);
-            std::vector<WCHAR> scratch(4 * 1024 + 4);
-            module_.entry<ObjInfosFn>("GetObjInfos")(0, 0, name.data(), scratch.data(),
-                                                     scratch.data() + 1024,
-                                                     scratch.data() + 2048,
-                                                     scratch.data() + 3072);
-            out += name.text();
+            out += identity()[0];
             ++i;
         } else {
             out += format[i];
         }
     }
     return out;
-}
-
-namespace {
-
-void printItems(Catalogue& catalogue, EventKind kind, const std::vector<MenuEntry>& items,
-                int depth, std::ostream& out) {
-    std::string indent(2 * static_cast<size_t>(depth), ' ');
-    for (const MenuEntry& item : items) {
-        if (item.kind == MenuEntry::Kind::Separator) {
-            out << indent << "----\n";
-            continue;
-        }
-        if (item.kind == MenuEntry::Kind::Popup) {
-            out << indent << toUtf8(item.text) << " >\n";
-            printItems(catalogue, kind, item.items, depth + 1, out);
-            continue;
-        }
-        int code = catalogue.codeFromMenu(kind, item.id);
-        out << indent << toUtf8(item.text) << "  [" << item.id << "]";
-        std::optional<EventEntry> entry =
-            code >= 0 ? catalogue.entry(kind, code) : std::optional<EventEntry>();
-        if (!entry) {
-            out << "  no event (code " << code << ")\n";
-            continue;
-        }
-        const std::vector<std::string>& names = routineNames(kind);
-        out << "  code " << code << ' '
-            << (static_cast<size_t>(code) < names.size() ? names[static_cast<size_t>(code)] : "?")
-            << ", flags " << hex(static_cast<uint16_t>(entry->flags)) << ": \""
-            << toUtf8(catalogue.displayText(kind, code)) << "\"\n";
-        for (size_t i = 0; i < entry->types.size(); ++i) {
-            int index = static_cast<int>(i);
-            std::u16string title = kind == EventKind::Expression
-                                       ? catalogue.expressionParam(code, index)
-                                       : catalogue.title(kind, code, index);
-            out << indent << "    %" << i << " " << paramTypeName(entry->types[i]) << ": \""
-                << toUtf8(title) << "\"\n";
-        }
-    }
-}
-
-}  // namespace
-
-void printEditorView(Catalogue& catalogue, std::ostream& out) {
-    const std::pair<EventKind, const char*> menus[] = {{EventKind::Condition, "Conditions"},
-                                                       {EventKind::Action, "Actions"},
-                                                       {EventKind::Expression, "Expressions"}};
-    for (auto [kind, heading] : menus) {
-        out << heading << '\n';
-        std::optional<std::vector<MenuEntry>> items = catalogue.menuItems(kind);
-        if (!items) {
-            out << "  (the module gave no menu)\n";
-            continue;
-        }
-        printItems(catalogue, kind, *items, 1, out);
-    }
 }
 
 }  // namespace hv

@@ -43,13 +43,15 @@ int usageError(std::ostream& err, const std::string& message) {
     return 2;
 }
 
-struct RunArguments {
+// What follows a command that loads the module: --module PATH (or --module=PATH), `--` to end
+// the options, and the operands.
+struct Arguments {
     std::string module;
-    std::vector<std::string> scripts;
+    std::vector<std::string> operands;
 };
 
-// Splits the arguments of `run`; returns an error or "".
-std::string runArguments(const std::vector<std::string>& args, RunArguments& parsed) {
+// Splits the arguments after the command; returns a usage error or "".
+std::string split(const std::vector<std::string>& args, Arguments& parsed) {
     bool options = true;
     for (size_t i = 1; i < args.size(); ++i) {
         const std::string& a = args[i];
@@ -63,49 +65,35 @@ std::string runArguments(const std::vector<std::string>& args, RunArguments& par
         } else if (options && a.size() > 1 && a[0] == '-') {
             return "unknown option " + a;
         } else {
-            parsed.scripts.push_back(a);
+            parsed.operands.push_back(a);
         }
     }
-    if (parsed.scripts.empty()) return "run needs at least one script";
+    if (parsed.module.empty()) parsed.module = defaultModulePath();
     return std::string();
 }
 
-// `run`: loads the module once and runs every script, each on a fresh instance.
-int runCommand(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
-    RunArguments parsed;
-    std::string error = runArguments(args, parsed);
+// `run`, `menus` and `catalogue`: each loads the module once. `run` runs every script on a
+// fresh instance; the other two print the editor's view of the module's events, for people or
+// for tools.
+int moduleCommand(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
+    Arguments parsed;
+    std::string error = split(args, parsed);
+    bool run = args[0] == "run";
+    if (error.empty() && run && parsed.operands.empty()) error = "run needs at least one script";
+    if (error.empty() && !run && !parsed.operands.empty())
+        error = args[0] + " takes no argument " + parsed.operands[0];
     if (!error.empty()) return usageError(err, error);
-    if (parsed.module.empty()) parsed.module = defaultModulePath();
     std::unique_ptr<Module> module = Module::load(parsed.module, &error);
     if (!module) {
         err << "hivelet-host: " << error << std::endl;
         return 2;
     }
-    Runner runner(*module, out, err);
-    unsigned failed = 0;
-    for (const std::string& script : parsed.scripts) failed += runner.runFile(script) ? 0 : 1;
-    out << parsed.scripts.size() << " script(s), " << failed << " failed" << std::endl;
-    return failed ? 1 : 0;
-}
-
-// `menus` and `catalogue`: the editor's view of the module's events, for people or for tools.
-int editorCommand(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
-    std::string path;
-    for (size_t i = 1; i < args.size(); ++i) {
-        if (args[i] == "--module" && i + 1 < args.size()) {
-            path = args[++i];
-        } else if (args[i].compare(0, 9, "--module=") == 0) {
-            path = args[i].substr(9);
-        } else {
-            return usageError(err, args[0] + " takes no argument " + args[i]);
-        }
-    }
-    if (path.empty()) path = defaultModulePath();
-    std::string error;
-    std::unique_ptr<Module> module = Module::load(path, &error);
-    if (!module) {
-        err << "hivelet-host: " << error << std::endl;
-        return 2;
+    if (run) {
+        Runner runner(*module, out, err);
+        unsigned failed = 0;
+        for (const std::string& script : parsed.operands) failed += runner.runFile(script) ? 0 : 1;
+        out << parsed.operands.size() << " script(s), " << failed << " failed" << std::endl;
+        return failed ? 1 : 0;
     }
     Editor editor;
     Catalogue catalogue(*module, editor);
@@ -170,9 +158,9 @@ int commandLine(const std::vector<std::string>& args, std::ostream& out, std::os
         out << Usage;
         return 0;
     }
-    if (command == "run") return runCommand(args, out, err);
+    if (command == "run" || command == "menus" || command == "catalogue")
+        return moduleCommand(args, out, err);
     if (command == "check") return checkCommand(args, out, err);
-    if (command == "menus" || command == "catalogue") return editorCommand(args, out, err);
     if (command == "dump-state") return dumpStateCommand(args, out, err);
     return usageError(err, "unknown command " + command);
 }

@@ -5,8 +5,18 @@ namespace hv {
 
 namespace {
 
+// The user's steps and where it stands in them.
+struct User {
+    const std::vector<UserStep>& steps;
+    int listId;
+    DialogSeen& seen;
+    size_t next = 0;
+    bool cancelled = false;
+    int idleTicks = 0;  // ticks left of a Wait step
+};
+
 // The user at work on this thread; a thread timer's procedure gets no context of its own.
-thread_local ScriptedUser* activeUser = nullptr;
+thread_local User* activeUser = nullptr;
 
 // The tick period, in milliseconds: a user that needs a few ticks finishes in well under a second.
 const UINT TickPeriod = 10;
@@ -73,93 +83,72 @@ void clickItem(HWND dialog, int listId, int index, bool twice) {
     if (twice) SendMessageW(dialog, WM_COMMAND, MAKEWPARAM(listId, LBN_DBLCLK), from);
 }
 
-}  // namespace
-
-std::string describe(const UserStep& step) {
-    switch (step.action) {
-        case UserStep::Action::Select: return "select " + std::to_string(step.index);
-        case UserStep::Action::DoubleClick: return "double " + std::to_string(step.index);
-        case UserStep::Action::Ok: return "ok";
-        case UserStep::Action::Cancel: return "cancel";
-        case UserStep::Action::Enter: return "enter";
-        case UserStep::Action::Escape: return "escape";
-        case UserStep::Action::CloseBox: return "close";
-        case UserStep::Action::Wait: return "wait " + std::to_string(step.index);
-    }
-    return "?";
-}
-
-ScriptedUser::ScriptedUser(std::vector<UserStep> steps, int listId)
-    : steps_(std::move(steps)), listId_(listId) {}
-
-ScriptedUser::~ScriptedUser() {
-    if (timer_) finish();
-}
-
-void ScriptedUser::start() {
-    activeUser = this;
-    timer_ = SetTimer(nullptr, 0, TickPeriod, &ScriptedUser::onTick);
-}
-
-void ScriptedUser::finish() {
-    if (timer_) KillTimer(nullptr, timer_);
-    timer_ = 0;
-    if (activeUser == this) activeUser = nullptr;
-    // A step that was not followed by another look closed the dialog.
-    if (next_ > seen_.openAfter.size()) seen_.openAfter.push_back(false);
-}
-
-void CALLBACK ScriptedUser::onTick(HWND, UINT, UINT_PTR, DWORD) {
-    if (activeUser) activeUser->tick();
-}
-
-void ScriptedUser::tick() {
-    HWND dialog = threadDialog();
-    if (!dialog) return;
-    if (!seen_.appeared) look(dialog);
-    if (next_ > seen_.openAfter.size()) seen_.openAfter.push_back(true);
-    if (HWND list = GetDlgItem(dialog, listId_))
-        seen_.lastSelection = static_cast<int>(SendMessageW(list, LB_GETCURSEL, 0, 0));
-    if (idleTicks_ > 0) {
-        --idleTicks_;
-    } else if (next_ < steps_.size()) {
-        perform(dialog, steps_[next_++]);
-    } else if (!cancelled_) {
-        // Nothing left to do, and the dialog is still there: leave it as Cancel would.
-        seen_.ranOut = true;
-        cancelled_ = true;
-        SendMessageW(dialog, WM_COMMAND, MAKEWPARAM(IDCANCEL, BN_CLICKED),
-                     reinterpret_cast<LPARAM>(GetDlgItem(dialog, IDCANCEL)));
-    } else {
-        seen_.forced = true;
-        EndDialog(dialog, -2);
-    }
-}
-
-void ScriptedUser::look(HWND dialog) {
-    dialog_ = dialog;
-    seen_.appeared = true;
-    seen_.caption = windowText(dialog);
-    seen_.className = className(dialog);
-    if (HWND list = GetDlgItem(dialog, listId_)) {
-        seen_.items = listItems(list);
-        seen_.initialSelection = static_cast<int>(SendMessageW(list, LB_GETCURSEL, 0, 0));
+void look(User& user, HWND dialog) {
+    DialogSeen& seen = user.seen;
+    seen.appeared = true;
+    seen.caption = windowText(dialog);
+    seen.className = className(dialog);
+    if (HWND list = GetDlgItem(dialog, user.listId)) {
+        seen.items = listItems(list);
+        seen.initialSelection = static_cast<int>(SendMessageW(list, LB_GETCURSEL, 0, 0));
     }
     HWND focus = GetFocus();
-    seen_.initialFocus = focus && GetParent(focus) == dialog ? GetDlgCtrlID(focus) : 0;
+    seen.initialFocus = focus && GetParent(focus) == dialog ? GetDlgCtrlID(focus) : 0;
 }
 
-void ScriptedUser::perform(HWND dialog, const UserStep& step) {
+void perform(User& user, HWND dialog, const UserStep& step) {
     switch (step.action) {
-        case UserStep::Action::Select: clickItem(dialog, listId_, step.index, false); break;
-        case UserStep::Action::DoubleClick: clickItem(dialog, listId_, step.index, true); break;
+        case UserStep::Action::Select: clickItem(dialog, user.listId, step.index, false); break;
+        case UserStep::Action::DoubleClick: clickItem(dialog, user.listId, step.index, true); break;
         case UserStep::Action::Ok: clickButton(dialog, IDOK); break;
         case UserStep::Action::Cancel: clickButton(dialog, IDCANCEL); break;
         case UserStep::Action::Enter: pressKey(dialog, VK_RETURN, 0x1C); break;
         case UserStep::Action::Escape: pressKey(dialog, VK_ESCAPE, 0x01); break;
         case UserStep::Action::CloseBox: PostMessageW(dialog, WM_SYSCOMMAND, SC_CLOSE, 0); break;
-        case UserStep::Action::Wait: idleTicks_ = step.index / static_cast<int>(TickPeriod); break;
+        case UserStep::Action::Wait:
+            user.idleTicks = step.index / static_cast<int>(TickPeriod);
+            break;
     }
+}
+
+// One look or one step per tick.
+void CALLBACK onTick(HWND, UINT, UINT_PTR, DWORD) {
+    HWND dialog = activeUser ? threadDialog() : nullptr;
+    if (!dialog) return;
+    User& user = *activeUser;
+    DialogSeen& seen = user.seen;
+    if (!seen.appeared) look(user, dialog);
+    if (user.next > seen.openAfter.size()) seen.openAfter.push_back(true);
+    if (user.idleTicks > 0) {
+        --user.idleTicks;
+    } else if (user.next < user.steps.size()) {
+        perform(user, dialog, user.steps[user.next++]);
+    } else if (!user.cancelled) {
+        // Nothing left to do, and the dialog is still there: leave it as Cancel would.
+        seen.ranOut = true;
+        user.cancelled = true;
+        SendMessageW(dialog, WM_COMMAND, MAKEWPARAM(IDCANCEL, BN_CLICKED),
+                     reinterpret_cast<LPARAM>(GetDlgItem(dialog, IDCANCEL)));
+    } else {
+        seen.forced = true;
+        EndDialog(dialog, -2);
+    }
+}
+
+}  // namespace
+
+intptr_t withUser(const std::vector<UserStep>& steps, int listId, DialogSeen& seen,
+                  const std::function<intptr_t()>& showDialog) {
+    seen = DialogSeen();
+    User user{steps, listId, seen};
+    activeUser = &user;
+    UINT_PTR timer = SetTimer(nullptr, 0, TickPeriod, onTick);
+    intptr_t result = showDialog();
+    KillTimer(nullptr, timer);
+    activeUser = nullptr;
+    // A step that was not followed by another look closed the dialog.
+    if (user.next > seen.openAfter.size()) seen.openAfter.push_back(false);
+    return result;
 }
 
 }  // namespace hv

@@ -38,7 +38,6 @@ Editor::~Editor() {
 
 void Editor::setHostVersion(uint32_t version, bool present) {
     version_ = version;
-    present_ = present;
     auto service = present ? &EditorServices::getHostVersion : nullptr;
     writeAt(bytes_.data(), hostLayout.getHostVersion, service);
 }

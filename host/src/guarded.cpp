@@ -5,11 +5,8 @@
 
 namespace hv {
 
-Guarded::Guarded(std::string name, size_t size, uint8_t content)
-    : name_(std::move(name)),
-      size_(size),
-      guard_(fill::guardSize),
-      bytes_(size + 2 * fill::guardSize, fill::guard) {
+Guarded::Guarded(std::string name, size_t size, uint8_t content, size_t guard)
+    : name_(std::move(name)), size_(size), guard_(guard), bytes_(size + 2 * guard, fill::guard) {
     std::memset(data(), content, size_);
 }
 

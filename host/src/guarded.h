@@ -2,6 +2,8 @@
 // sides, either lent for writing (only the guards are checked) or sealed (no byte may change).
 #pragma once
 
+#include <hivelet/host.h>
+
 #include <cstddef>
 #include <cstdint>
 #include <string>
@@ -11,7 +13,8 @@ namespace hv {
 
 class Guarded {
 public:
-    Guarded(std::string name, size_t size, uint8_t content);
+    // `guard` bytes of fill::guard before and after the block.
+    Guarded(std::string name, size_t size, uint8_t content, size_t guard = fill::guardSize);
     uint8_t* data() { return bytes_.data() + guard_; }
     const uint8_t* data() const { return bytes_.data() + guard_; }
     size_t size() const { return size_; }

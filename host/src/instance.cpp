@@ -112,38 +112,31 @@ struct Services {
     }
 
     // Both expression-parameter services take the same constant and the routine's host value.
-    static EventState* expressionEvent(void* record, int one, Slot hostValue, const char* service) {
-        Instance* self = owner(record, service);
-        if (!self) return nullptr;
+    static Slot expressionParameter(void* record, int one, Slot hostValue, bool first) {
+        std::string name = first ? "GetFirstExpressionParameter" : "GetNextExpressionParameter";
+        Instance* self = owner(record, name.c_str());
+        if (!self) return 0;
         EventState& e = *self->event_;
         ++e.outcome->expressionFetches;
-        std::string name = service;
         if (e.kind != EventKind::Expression) e.note(name + " called by " + withArticle(e.kind));
         if (one != 1) e.note(name + ": second argument " + std::to_string(one) + ", not 1");
         if (hostValue != e.hostValue)
             e.note(name + ": host value " + hex(static_cast<uint64_t>(hostValue)) +
                    ", not the expression's " + hex(static_cast<uint64_t>(e.hostValue)));
-        return &e;
+        if (first && e.firstExpressionAsked) e.note(name + " called again");
+        if (!first && !e.firstExpressionAsked)
+            e.note(name + " called before GetFirstExpressionParameter");
+        e.firstExpressionAsked = true;
+        if (first) e.nextExpressionParameter = 0;
+        return e.take(e.nextExpressionParameter++, name.c_str());
     }
 
     static Slot WINAPI firstExpressionParameter(void* record, int one, Slot hostValue) {
-        const char* name = "GetFirstExpressionParameter";
-        EventState* e = expressionEvent(record, one, hostValue, name);
-        if (!e) return 0;
-        if (e->firstExpressionAsked) e->note("GetFirstExpressionParameter called again");
-        e->firstExpressionAsked = true;
-        e->nextExpressionParameter = 1;
-        return e->take(0, name);
+        return expressionParameter(record, one, hostValue, true);
     }
 
     static Slot WINAPI nextExpressionParameter(void* record, int one, Slot hostValue) {
-        const char* name = "GetNextExpressionParameter";
-        EventState* e = expressionEvent(record, one, hostValue, name);
-        if (!e) return 0;
-        if (!e->firstExpressionAsked)
-            e->note("GetNextExpressionParameter called before GetFirstExpressionParameter");
-        e->firstExpressionAsked = true;
-        return e->take(e->nextExpressionParameter++, name);
+        return expressionParameter(record, one, hostValue, false);
     }
 
     static Slot WINAPI getNextParameter(void* record, int allBits, int zero) {
@@ -170,10 +163,9 @@ Instance::Instance(Module& module) : module_(module) {
                                  " bytes, less than the host's own header");
     // The accessors read the module's fields at their offsets even if the module asked for
     // too little: those bytes then lie in the guard, inside the allocation.
-    size_t span = std::max(recordSize_, hostLayout.recordSize);
-    storage_.assign(span + 2 * fill::guardSize, fill::guard);
-    record_ = storage_.data() + fill::guardSize;
-    std::memset(record_, fill::record, recordSize_);
+    size_t guard = fill::guardSize + std::max(recordSize_, hostLayout.recordSize) - recordSize_;
+    block_ = std::make_unique<Guarded>("record", recordSize_, fill::record, guard);
+    record_ = block_->data();
     layOutHeader();
     liveRecords()[record_] = this;
     create(record_, 0, 0);
@@ -355,16 +347,8 @@ void Instance::checkSentinels(Outcome& outcome) {
 // The guards around the record, the header bytes the module must leave alone, and the header
 // flags, of which the module may only set StringResultFlag.
 std::string Instance::damageToRecord() const {
-    long before = firstNotPattern(storage_.data(), fill::guard, fill::guardSize);
-    if (before >= 0)
-        return "record: byte " + std::to_string(fill::guardSize - before) +
-               " before its start was written";
-    size_t tail = storage_.size() - fill::guardSize - recordSize_;
-    long after = firstNotPattern(record_ + recordSize_, fill::guard, tail);
-    if (after >= 0)
-        return "record: byte " + std::to_string(recordSize_ + after) + ", past its " +
-               std::to_string(recordSize_) + " bytes, was written";
-    return damageToHeader();
+    std::string damage = block_->damage();
+    return damage.empty() ? damageToHeader() : damage;
 }
 
 // Header bytes compared with their state before the event; flags may only gain bits.
@@ -380,51 +364,6 @@ std::string Instance::damageToHeader() const {
     uint16_t cleared = readAt<uint16_t>(was.data(), flags) & ~headerFlags();
     if (cleared) return "record header: headerFlags bits " + hex(cleared) + " were cleared";
     return std::string();
-}
-
-uint32_t Instance::rootKeyIndex() const {
-    return readAt<uint32_t>(record_, hostLayout.rootKeyIndex);
-}
-
-const char16_t* Instance::currentKey() const {
-    return readAt<const char16_t*>(record_, hostLayout.currentKey);
-}
-
-uint32_t Instance::lastError() const {
-    return readAt<uint32_t>(record_, hostLayout.lastError);
-}
-
-uint32_t Instance::use64BitView() const {
-    return readAt<uint32_t>(record_, hostLayout.use64BitView);
-}
-
-uint16_t Instance::headerFlags() const {
-    return readAt<uint16_t>(record_, hostLayout.headerFlags);
-}
-
-void Instance::setRootKeyIndex(uint32_t value) {
-    writeAt(record_, hostLayout.rootKeyIndex, value);
-}
-
-void Instance::setLastError(uint32_t value) {
-    writeAt(record_, hostLayout.lastError, value);
-}
-
-void Instance::setHeaderFlags(uint16_t value) {
-    writeAt(record_, hostLayout.headerFlags, value);
-}
-
-size_t Instance::rootKeyIndexOffset() {
-    return hostLayout.rootKeyIndex;
-}
-size_t Instance::currentKeyOffset() {
-    return hostLayout.currentKey;
-}
-size_t Instance::lastErrorOffset() {
-    return hostLayout.lastError;
-}
-size_t Instance::use64BitViewOffset() {
-    return hostLayout.use64BitView;
 }
 
 }  // namespace hv

@@ -26,19 +26,6 @@ inline std::string withArticle(EventKind kind) {
     return (kind == EventKind::Condition ? "a " : "an ") + std::string(kindName(kind));
 }
 
-// Reads and writes of host fields at byte offsets; memcpy, since many are not aligned.
-template <typename T>
-T readAt(const uint8_t* base, size_t offset) {
-    T value;
-    std::memcpy(&value, base + offset, sizeof value);
-    return value;
-}
-
-template <typename T>
-void writeAt(uint8_t* base, size_t offset, T value) {
-    std::memcpy(base + offset, &value, sizeof value);
-}
-
 // The first byte of [data, data + size) that differs from `expected`, or -1.
 long firstDifference(const uint8_t* data, const uint8_t* expected, size_t size);
 // The first byte of [data, data + size) that is not `pattern`, or -1.

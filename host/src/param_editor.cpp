@@ -12,6 +12,9 @@ typedef Slot(WINAPI* EditParameterFn)(void* editor, Slot unused, void* record);
 typedef void(WINAPI* GetParameterStringFn)(void* editor, Slot unused, const void* record,
                                            LPWSTR buffer, Slot capacity);
 
+// The dialog's list of root keys.
+const int RootKeyList = 1001;
+
 const char16_t BufferFill = static_cast<char16_t>(fill::buffer << 8 | fill::buffer);
 
 }  // namespace
@@ -50,10 +53,9 @@ void ParamEditor::init() {
 
 Slot ParamEditor::edit(const std::vector<UserStep>& steps, DialogSeen* seen) {
     auto edit = module_.entry<EditParameterFn>("EditParameter");
-    ScriptedUser user(steps);
-    Slot result = user.run([&] { return edit(editor_.structure(), 0, record()); });
-    if (seen) *seen = user.seen();
-    return result;
+    DialogSeen ignored;
+    return withUser(steps, RootKeyList, seen ? *seen : ignored,
+                    [&] { return edit(editor_.structure(), 0, record()); });
 }
 
 ParamEditor::Text ParamEditor::string(Slot capacity) {

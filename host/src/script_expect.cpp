@@ -1,4 +1,7 @@
 // Expectations: what an `expect` line can check, how its operands are read and how it is checked.
+#include <algorithm>
+
+#include "internal.h"
 #include "script_internal.h"
 
 namespace hv::script {
@@ -6,87 +9,101 @@ namespace hv::script {
 namespace {
 
 // Reads exactly one integer operand (a non-negative one when `count` says it is a count).
-std::string oneInteger(const std::vector<Token>& operands, Step& step, bool count) {
-    std::string what = "expect " + step.subject;
-    if (operands.empty() || operands[0].quoted) return what + " needs an integer";
-    if (operands.size() > 1) return "stray text after " + what + " " + operands[0].word;
-    Value value;
-    value.kind = Value::Kind::Integer;
-    std::string error = parseInteger(operands[0].word, value.integer);
-    if (error.empty() && count && value.integer < 0) error = what + " needs a count";
-    step.values.push_back(value);
-    return error;
+int64_t oneInteger(Operands& in, const std::string& what, bool count) {
+    if (in.left() > 1 && !in.peek()->quoted) refuse("stray text after " + what + " " + in.word());
+    int64_t value = in.integer(what + " needs an integer");
+    if (count && value < 0) refuse(what + " needs a count");
+    return value;
 }
 
-// Subjects with one integer, and with one count or a list of counts.
-std::string parseInteger1(const std::vector<Token>& operands, Step& step) {
-    return oneInteger(operands, step, false);
+// expect [result] VALUE: a text, true, false or an integer.
+Command parseResult(Operands& in) {
+    const Token* t = in.next();
+    if (!t) refuse("expect result needs a value");
+    in.end();
+    ExpectResult line;
+    int64_t n = 0;
+    if (t->quoted)
+        line.value = t->text;
+    else if (t->word == "true" || t->word == "false")
+        line.value = t->word == "true";
+    else if (parseInteger(t->word, n).empty())
+        line.value = n;
+    else
+        refuse(
+            "expect takes a text, an integer, true, false or one of: error, message, fetches, "
+            "buffers, address, rootKeyIndex, currentKey, use64BitView, debug, file; not '" +
+            t->word + "'");
+    return line;
 }
 
-std::string parseCount(const std::vector<Token>& operands, Step& step) {
-    return oneInteger(operands, step, true);
-}
-
-std::string parseCounts(const std::vector<Token>& operands, Step& step) {
-    for (const Token& t : operands) {
-        std::vector<Token> one{t};
-        std::string error = oneInteger(one, step, true);
-        if (!error.empty()) return error;
+// expect buffers N...
+Command parseBuffers(Operands& in) {
+    ExpectBuffers line;
+    while (in.left()) {
+        Operands one({*in.next()});
+        line.sizes.push_back(static_cast<size_t>(oneInteger(one, "expect buffers", true)));
     }
-    return std::string();
+    return line;
 }
 
-// A result value: a text, true, false or an integer.
-std::string parseResult(const std::vector<Token>& operands, Step& step) {
-    if (operands.empty()) return "expect result needs a value";
-    if (operands.size() > 1)
-        return "stray text '" + (operands[1].quoted ? quote(operands[1].text) : operands[1].word) +
-               "'";
-    Value value;
-    const Token& t = operands[0];
-    if (t.quoted) {
-        value.kind = Value::Kind::Text;
-        value.text = t.text;
-    } else if (t.word == "true" || t.word == "false") {
-        value.kind = Value::Kind::Boolean;
-        value.boolean = t.word == "true";
-    } else {
-        value.kind = Value::Kind::Integer;
-        std::string error = parseInteger(t.word, value.integer);
-        if (!error.empty())
-            return "expect takes a text, an integer, true, false or one of: error, message, "
-                   "fetches, buffers, address, rootKeyIndex, currentKey, use64BitView, debug, file; not '" +
-                   t.word + "'";
-    }
-    step.values.push_back(value);
-    return std::string();
+const std::pair<const char*, Outcome::TextSource> Places[] = {
+    {"currentKey", Outcome::TextSource::CurrentKey},
+    {"buffer", Outcome::TextSource::LentBuffer},
+    {"elsewhere", Outcome::TextSource::Elsewhere}};
+
+// expect address currentKey|buffer|elsewhere
+Command parseAddress(Operands& in) {
+    std::string word = in.left() == 1 ? in.word() : "";
+    for (auto [name, place] : Places)
+        if (word == name) return ExpectAddress{place};
+    refuse("expect address takes currentKey, buffer or elsewhere");
 }
 
-const char* const Places[] = {"currentKey", "buffer", "elsewhere"};
-
-// One of the places a text result can lie in.
-std::string parsePlace(const std::vector<Token>& operands, Step& step) {
-    bool known = false;
-    if (operands.size() == 1 && !operands[0].quoted)
-        for (const char* p : Places) known = known || operands[0].word == p;
-    if (!known) return "expect address takes currentKey, buffer or elsewhere";
-    Value value;
-    value.kind = Value::Kind::Word;
-    value.word = operands[0].word;
-    step.values.push_back(value);
-    return std::string();
+// expect currentKey "text" | null
+Command parseCurrentKey(Operands& in) {
+    const Token* t = in.left() == 1 ? in.next() : nullptr;
+    if (!t || (!t->quoted && t->word != "null")) refuse("expect currentKey takes a text or null");
+    ExpectCurrentKey line;
+    if (t->quoted) line.key = t->text;
+    return line;
 }
 
-// A text, or null for none.
-std::string parseTextOrNull(const std::vector<Token>& operands, Step& step) {
-    bool ok = operands.size() == 1 && (operands[0].quoted || operands[0].word == "null");
-    if (!ok) return "expect " + step.subject + " takes a text or null";
-    Value value;
-    value.kind = operands[0].quoted ? Value::Kind::Text : Value::Kind::Null;
-    value.text = operands[0].text;
-    step.values.push_back(value);
-    return std::string();
+// expect sentence "text"
+Command parseSentence(Operands& in) {
+    if (in.left() != 1) refuse("expect sentence needs a text");
+    return ExpectSentence{in.text("expect sentence needs a text")};
 }
+
+// expect debug ITEM "text" | untouched
+Command parseDebug(Operands& in) {
+    const Token* item = in.peek();
+    const Token* text = in.peek(1);
+    if (in.left() != 2 || item->quoted || (!text->quoted && text->word != "untouched"))
+        refuse("expect debug takes an item number and a text in quotes or untouched");
+    ExpectDebug line;
+    line.item = static_cast<int32_t>(in.integer(""));
+    if (text->quoted) line.text = text->text;
+    return line;
+}
+
+const std::pair<const char*, Parser> Subjects[] = {
+    {"result", parseResult},
+    {"buffers", parseBuffers},
+    {"address", parseAddress},
+    {"currentKey", parseCurrentKey},
+    {"sentence", parseSentence},
+    {"debug", parseDebug},
+    {"file", [](Operands& in) -> Command { return parseFileBytes(in, true); }},
+};
+
+// The subjects that take one integer.
+const std::pair<const char*, ExpectNumber::Of> Numbers[] = {
+    {"error", ExpectNumber::Of::LastError},
+    {"message", ExpectNumber::Of::Message},
+    {"fetches", ExpectNumber::Of::Fetches},
+    {"rootKeyIndex", ExpectNumber::Of::RootKeyIndex},
+    {"use64BitView", ExpectNumber::Of::Use64BitView}};
 
 // What the last event gave, for messages.
 std::string got(Session& s) {
@@ -98,67 +115,57 @@ std::string got(Session& s) {
            std::to_string(o.asInteger());
 }
 
-// The last event returned exactly this text.
-bool checkText(Session& s, const std::u16string& wanted, const std::string& what,
-               std::string& why) {
-    const Outcome& o = *s.last();
-    if (o.isText && o.text == wanted) return true;
-    why = "expected " + what + ", got " + got(s);
-    return false;
-}
-
-// Integers compare at the width of the routine's result: 16 bits for actions, 32 otherwise.
-bool checkResult(Session& s, const Step& step, std::string& why) {
-    const Value& v = step.values[0];
-    const Outcome& o = *s.last();
-    if (v.kind == Value::Kind::Text) return checkText(s, v.text, quote(v.text), why);
-    if (v.kind == Value::Kind::Boolean) {
-        if (s.lastKind() == EventKind::Condition && o.asCondition() == (v.boolean ? 1 : 0))
-            return true;
-        why = std::string("expected ") + (v.boolean ? "true" : "false") + ", got " + got(s);
-        return false;
-    }
-    auto wanted = static_cast<uint32_t>(v.integer);
-    bool same = s.lastKind() == EventKind::Action
-                    ? static_cast<uint16_t>(o.asAction()) == static_cast<uint16_t>(wanted)
-                    : !o.isText && static_cast<uint32_t>(o.asInteger()) == wanted;
-    if (!same) why = "expected " + std::to_string(v.integer) + ", got " + got(s);
-    return same;
+// Why the last event did not return exactly this text, or "".
+std::string textWhy(Session& s, const std::u16string& wanted, const std::string& what) {
+    const Outcome& o = s.lastEvent();
+    return o.isText && o.text == wanted ? "" : "expected " + what + ", got " + got(s);
 }
 
 // A 32-bit field or count against the expected value.
-bool checkNumber(const char* what, int64_t wanted, uint64_t actual, std::string& why) {
-    if (static_cast<uint64_t>(static_cast<uint32_t>(wanted)) == actual) return true;
-    why = std::string("expected ") + what + " " + std::to_string(wanted) + ", got " +
-          std::to_string(actual);
-    return false;
+std::string numberWhy(const char* what, int64_t wanted, uint64_t actual) {
+    if (static_cast<uint64_t>(static_cast<uint32_t>(wanted)) == actual) return std::string();
+    return std::string("expected ") + what + " " + std::to_string(wanted) + ", got " +
+           std::to_string(actual);
 }
 
-// The record fields, read at this build's offsets.
-bool checkError(Session& s, const Step& step, std::string& why) {
-    return checkNumber("lastError", step.values[0].integer, s.instance().lastError(), why);
+// Integers compare at the width of the routine's result: 16 bits for actions, 32 otherwise.
+std::string resultWhy(Session& s, const ExpectResult& line) {
+    const Outcome& o = s.lastEvent();
+    if (auto* text = std::get_if<std::u16string>(&line.value))
+        return textWhy(s, *text, quote(*text));
+    if (auto* truth = std::get_if<bool>(&line.value)) {
+        if (s.lastKind() == EventKind::Condition && o.asCondition() == (*truth ? 1 : 0)) return "";
+        return std::string("expected ") + (*truth ? "true" : "false") + ", got " + got(s);
+    }
+    int64_t n = std::get<int64_t>(line.value);
+    auto wanted = static_cast<uint32_t>(n);
+    bool same = s.lastKind() == EventKind::Action
+                    ? static_cast<uint16_t>(o.asAction()) == static_cast<uint16_t>(wanted)
+                    : !o.isText && static_cast<uint32_t>(o.asInteger()) == wanted;
+    return same ? "" : "expected " + std::to_string(n) + ", got " + got(s);
 }
 
-bool checkRootKeyIndex(Session& s, const Step& step, std::string& why) {
-    return checkNumber("rootKeyIndex", step.values[0].integer, s.instance().rootKeyIndex(), why);
-}
-
-bool checkUse64BitView(Session& s, const Step& step, std::string& why) {
-    return checkNumber("use64BitView", step.values[0].integer, s.instance().use64BitView(), why);
-}
-
-// The host asks the system itself, so the check holds for every system's texts.
-bool checkMessage(Session& s, const Step& step, std::string& why) {
-    auto code = static_cast<uint32_t>(step.values[0].integer);
+// The system's message is asked for here, so the check holds for every system's texts.
+std::string fieldWhy(Session& s, const ExpectNumber& line) {
+    Instance& instance = s.instance();
+    switch (line.of) {
+        case ExpectNumber::Of::LastError:
+            return numberWhy("lastError", line.value, instance.lastError());
+        case ExpectNumber::Of::RootKeyIndex:
+            return numberWhy("rootKeyIndex", line.value, instance.rootKeyIndex());
+        case ExpectNumber::Of::Use64BitView:
+            return numberWhy("use64BitView", line.value, instance.use64BitView());
+        case ExpectNumber::Of::Fetches: {
+            const Outcome& o = s.lastEvent();
+            return numberWhy("parameter fetches", line.value,
+                             o.parameterFetches + o.expressionFetches);
+        }
+        default: break;
+    }
+    auto code = static_cast<uint32_t>(line.value);
     std::u16string wanted = systemMessage(code);
-    return checkText(
-        s, wanted, "the system's message for " + std::to_string(code) + ", " + quote(wanted), why);
-}
-
-bool checkFetches(Session& s, const Step& step, std::string& why) {
-    const Outcome& o = *s.last();
-    return checkNumber("parameter fetches", step.values[0].integer,
-                       o.parameterFetches + o.expressionFetches, why);
+    return textWhy(s, wanted,
+                   "the system's message for " + std::to_string(code) + ", " + quote(wanted));
 }
 
 // Buffer sizes as "[1024 8]".
@@ -168,80 +175,106 @@ std::string listed(const std::vector<size_t>& sizes) {
     return "[" + out + "]";
 }
 
-// The sizes asked of GetStringBuffer, in order.
-bool checkBuffers(Session& s, const Step& step, std::string& why) {
-    std::vector<size_t> wanted;
-    for (const Value& v : step.values) wanted.push_back(static_cast<size_t>(v.integer));
-    const std::vector<size_t>& asked = s.last()->bufferRequests;
-    if (asked == wanted) return true;
-    why = "expected buffer requests " + listed(wanted) + ", got " + listed(asked);
-    return false;
-}
-
-// Which host or module block the text result lies in.
-bool checkAddress(Session& s, const Step& step, std::string& why) {
-    const Outcome& o = *s.last();
-    static const char* const names[] = {"", "buffer", "currentKey", "elsewhere"};
+// Where a text result lies, as messages say it.
+const char* placePhrase(Outcome::TextSource place) {
     static const char* const phrases[] = {"", "in a lent buffer", "in currentKey", "elsewhere"};
-    auto source = static_cast<size_t>(o.textSource);
-    if (step.values[0].word == names[source]) return true;
-    size_t wanted = 1;
-    while (wanted < 3 && step.values[0].word != names[wanted]) ++wanted;
-    why = std::string("expected the text result ") + phrases[wanted] + ", " +
-          (o.isText ? std::string("found it ") + phrases[source] : "got no text result");
-    return false;
+    return phrases[static_cast<size_t>(place)];
 }
 
-// The record's current key, compared as text.
-bool checkCurrentKey(Session& s, const Step& step, std::string& why) {
-    const char16_t* key = s.instance().currentKey();
-    const Value& v = step.values[0];
-    bool same = v.kind == Value::Kind::Null ? key == nullptr : key && v.text == key;
-    if (!same) why = "expected currentKey " + describe(v) + ", got " + (key ? quote(key) : "null");
-    return same;
+// The debugger line as the transcript shows it: quoted, and whether the buffer was touched.
+std::string shownLine(const Instance::DebugLine& line) {
+    return line.written ? quote(line.text()) : "(buffer untouched)";
 }
 
-// A text operand.
-std::string parseText(const std::vector<Token>& operands, Step& step) {
-    if (operands.size() != 1 || !operands[0].quoted) return "expect " + step.subject + " needs a text";
-    Value value;
-    value.kind = Value::Kind::Text;
-    value.text = operands[0].text;
-    step.values.push_back(value);
-    return std::string();
+// What a debugger line must look like: the text, zeros up to the 256th character.
+bool lineIs(const Instance::DebugLine& line, const std::u16string& text) {
+    if (!line.written || text.size() >= Instance::DebugLineChars) return false;
+    std::vector<char16_t> wanted(Instance::DebugLineChars, 0);
+    std::copy(text.begin(), text.end(), wanted.begin());
+    return line.buffer == wanted;
 }
-
-bool checkSentence(Session& s, const Step& step, std::string& why) {
-    if (!s.sentence) {
-        why = "expect sentence with no show line before it";
-        return false;
-    }
-    bool same = *s.sentence == step.values[0].text;
-    if (!same) why = "expected the sentence " + quote(step.values[0].text) + ", got " + quote(*s.sentence);
-    return same;
-}
-
-const Subject Subjects[] = {
-    {"result", true, parseResult, checkResult},
-    {"error", false, parseInteger1, checkError},
-    {"message", true, parseInteger1, checkMessage},
-    {"fetches", true, parseCount, checkFetches},
-    {"buffers", true, parseCounts, checkBuffers},
-    {"address", true, parsePlace, checkAddress},
-    {"rootKeyIndex", false, parseInteger1, checkRootKeyIndex},
-    {"use64BitView", false, parseInteger1, checkUse64BitView},
-    {"currentKey", false, parseTextOrNull, checkCurrentKey},
-    {"sentence", false, parseText, checkSentence},
-    {"debug", false, parseDebugExpect, checkDebug},
-    {"file", false, parseFileExpect, checkFile},
-};
 
 }  // namespace
 
-const Subject* findSubject(const std::string& name) {
-    for (const Subject& s : Subjects)
-        if (name == s.name) return &s;
-    return nullptr;
+// An expectation names its subject, or checks the result when its first operand is a value.
+Command parseExpect(Operands& in) {
+    if (!in.left()) refuse("expect needs a value");
+    std::string word = in.peek()->quoted ? "" : in.peek()->word;
+    for (auto [name, of] : Numbers)
+        if (word == name) {
+            in.word();
+            return ExpectNumber{of,
+                                oneInteger(in, "expect " + word, of == ExpectNumber::Of::Fetches)};
+        }
+    for (auto [name, parser] : Subjects)
+        if (word == name) {
+            in.word();
+            return parser(in);
+        }
+    return parseResult(in);
+}
+
+void run(Session& s, const Step& step, const ExpectResult& line) {
+    s.checked(step, resultWhy(s, line));
+}
+
+void run(Session& s, const Step& step, const ExpectNumber& line) {
+    s.checked(step, fieldWhy(s, line));
+}
+
+void run(Session& s, const Step& step, const ExpectBuffers& line) {
+    const std::vector<size_t>& asked = s.lastEvent().bufferRequests;
+    s.checked(step, asked == line.sizes ? ""
+                                        : "expected buffer requests " + listed(line.sizes) +
+                                              ", got " + listed(asked));
+}
+
+void run(Session& s, const Step& step, const ExpectAddress& line) {
+    const Outcome& o = s.lastEvent();
+    std::string why;
+    if (o.textSource != line.place)
+        why = std::string("expected the text result ") + placePhrase(line.place) + ", " +
+              (o.isText ? std::string("found it ") + placePhrase(o.textSource)
+                        : "got no text result");
+    s.checked(step, why);
+}
+
+void run(Session& s, const Step& step, const ExpectCurrentKey& line) {
+    const char16_t* key = s.instance().currentKey();
+    bool same = line.key ? key && *line.key == key : key == nullptr;
+    s.checked(step, same ? ""
+                         : "expected currentKey " + (line.key ? quote(*line.key) : "null") +
+                               ", got " + (key ? quote(key) : "null"));
+}
+
+void run(Session& s, const Step& step, const ExpectSentence& line) {
+    if (!s.sentence) refuse("expect sentence with no show line before it");
+    s.checked(step, *s.sentence == line.text ? ""
+                                             : "expected the sentence " + quote(line.text) +
+                                                   ", got " + quote(*s.sentence));
+}
+
+void run(Session& s, const Step& step, const ExpectDebug& line) {
+    Instance::DebugLine shown = s.instance().debugLine(line.item);
+    if (!shown.sentinelsIntact) refuse("GetDebugItem wrote past the 256-character line");
+    bool same = line.text ? lineIs(shown, *line.text) : !shown.written;
+    s.checked(step, same ? ""
+                         : "expected the debugger line " +
+                               (line.text ? quote(*line.text) + " padded with zeros"
+                                          : "buffer untouched") +
+                               ", got " + shownLine(shown));
+}
+
+// debug: both lines of the debugger.
+void run(Session& s, const Step& step, const Debug&) {
+    std::string shown;
+    for (int item : {0, 1}) {
+        Instance::DebugLine line = s.instance().debugLine(item);
+        if (!line.sentinelsIntact)
+            refuse("sentinel hit: GetDebugItem wrote past the 256-character line");
+        shown += (item ? " | " : "") + shownLine(line);
+    }
+    s.show(step, "=> " + shown);
 }
 
 }  // namespace hv::script

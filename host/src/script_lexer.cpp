@@ -1,5 +1,4 @@
-// Splitting script lines into tokens, and the values that tokens stand for.
-#include <algorithm>
+// Splitting script lines into tokens, and the values, integers and bytes that tokens stand for.
 #include <cctype>
 
 #include "script_internal.h"
@@ -12,8 +11,12 @@ bool isBlank(char c) {
     return c == ' ' || c == '\t';
 }
 
-// Resolves the escape after a backslash at `pos`; returns an error or "".
-std::string escape(const std::string& line, size_t& pos, std::u16string& text) {
+bool isHex(char c) {
+    return std::isxdigit(static_cast<unsigned char>(c)) != 0;
+}
+
+// Resolves the escape after a backslash at `pos`.
+void escape(const std::string& line, size_t& pos, std::u16string& text) {
     char c = line[pos];
     switch (c) {
         case '\\': text += u'\\'; break;
@@ -24,23 +27,20 @@ std::string escape(const std::string& line, size_t& pos, std::u16string& text) {
         case 'u': {
             std::string digits = line.substr(pos + 1, 4);
             size_t valid = 0;
-            while (valid < digits.size() &&
-                   std::isxdigit(static_cast<unsigned char>(digits[valid])))
-                ++valid;
+            while (valid < digits.size() && isHex(digits[valid])) ++valid;
             if (valid < 4)
-                return "bad escape \\u" + digits.substr(0, valid) + " (\\u takes four hex digits)";
+                refuse("bad escape \\u" + digits.substr(0, valid) + " (\\u takes four hex digits)");
             text += static_cast<char16_t>(std::stoul(digits, nullptr, 16));
             pos += 4;
             break;
         }
-        default: return std::string("bad escape \\") + c;
+        default: refuse(std::string("bad escape \\") + c);
     }
     ++pos;
-    return std::string();
 }
 
 // Reads a quoted text whose opening quote is at `pos`.
-std::string quoted(const std::string& line, size_t& pos, Token& token) {
+void quoted(const std::string& line, size_t& pos, Token& token) {
     std::string run;  // UTF-8 bytes since the last escape
     for (++pos; pos < line.size() && line[pos] != '"'; ++pos) {
         if (line[pos] != '\\') {
@@ -50,26 +50,23 @@ std::string quoted(const std::string& line, size_t& pos, Token& token) {
         if (++pos == line.size()) break;
         token.text += fromUtf8(run);
         run.clear();
-        std::string error = escape(line, pos, token.text);
-        if (!error.empty()) return error;
+        escape(line, pos, token.text);
         --pos;
     }
-    if (pos >= line.size()) return "missing closing quote";
+    if (pos >= line.size()) refuse("missing closing quote");
     token.text += fromUtf8(run);
     ++pos;
     if (pos < line.size() && !isBlank(line[pos]) && line[pos] != '#')
-        return "text after a closing quote";
+        refuse("text after a closing quote");
     token.quoted = true;
-    return std::string();
 }
 
 // Reads a bare word starting at `pos`.
-std::string bare(const std::string& line, size_t& pos, Token& token) {
+void bare(const std::string& line, size_t& pos, Token& token) {
     size_t start = pos;
     while (pos < line.size() && !isBlank(line[pos]) && line[pos] != '#') ++pos;
     token.word = line.substr(start, pos - start);
-    if (token.word.find('"') != std::string::npos) return "stray quote in '" + token.word + "'";
-    return std::string();
+    if (token.word.find('"') != std::string::npos) refuse("stray quote in '" + token.word + "'");
 }
 
 const char* const RootNames[] = {"HKEY_CLASSES_ROOT", "HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER",
@@ -90,102 +87,164 @@ bool looksNumeric(const std::string& word) {
 
 }  // namespace
 
-std::string lex(const std::string& line, size_t pos, std::vector<Token>& tokens, size_t* end) {
-    *end = line.size();
+std::vector<Token> lex(const std::string& line, size_t pos, size_t* end) {
+    std::vector<Token> tokens;
     while (true) {
         while (pos < line.size() && isBlank(line[pos])) ++pos;
-        if (pos >= line.size()) return std::string();
-        if (line[pos] == '#') {
-            *end = pos;
-            return std::string();
-        }
+        if (pos >= line.size() || line[pos] == '#') break;
         Token token;
-        std::string error = line[pos] == '"' ? quoted(line, pos, token) : bare(line, pos, token);
-        if (!error.empty()) return error;
+        line[pos] == '"' ? quoted(line, pos, token) : bare(line, pos, token);
         tokens.push_back(std::move(token));
     }
+    if (end) *end = pos;
+    return tokens;
 }
 
-std::string scanInteger(const std::string& word, IntegerDigits& number) {
-    number.hex = word.size() > 2 && word[0] == '0' && (word[1] == 'x' || word[1] == 'X');
-    number.negative = !number.hex && !word.empty() && word[0] == '-';
-    number.digits = word.substr(number.hex ? 2 : number.negative ? 1 : 0);
-    bool ok = !number.digits.empty();
-    for (char c : number.digits) {
-        auto u = static_cast<unsigned char>(c);
-        ok = ok && (number.hex ? std::isxdigit(u) : std::isdigit(u));
-    }
+const Token* Operands::peek(size_t ahead) const {
+    return at_ + ahead < tokens_.size() ? &tokens_[at_ + ahead] : nullptr;
+}
+
+std::string Operands::word() {
+    const Token* t = peek();
+    if (!t || t->quoted) return std::string();
+    ++at_;
+    return t->word;
+}
+
+bool Operands::text(std::u16string& out) {
+    const Token* t = peek();
+    if (!t || !t->quoted) return false;
+    out = t->text;
+    ++at_;
+    return true;
+}
+
+std::u16string Operands::text(const std::string& usage) {
+    std::u16string out;
+    if (!text(out)) refuse(usage);
+    return out;
+}
+
+int64_t Operands::integer(const std::string& usage) {
+    std::string number = word();
+    if (number.empty()) refuse(usage);
+    int64_t value = 0;
+    refuseIf(parseInteger(number, value));
+    return value;
+}
+
+bool Operands::takeLast(const char* word) {
+    bool found = left() && !tokens_.back().quoted && tokens_.back().word == word;
+    if (found) tokens_.pop_back();
+    return found;
+}
+
+void Operands::end() const {
+    if (const Token* t = peek())
+        refuse("stray text '" + (t->quoted ? quote(t->text) : t->word) + "'");
+}
+
+std::string parseInteger(const std::string& word, int bits, uint64_t& value) {
+    bool hex = word.size() > 2 && word[0] == '0' && (word[1] == 'x' || word[1] == 'X');
+    bool negative = !hex && !word.empty() && word[0] == '-';
+    std::string digits = word.substr(hex ? 2 : negative ? 1 : 0);
+    bool ok = !digits.empty();
+    for (char c : digits) ok = ok && (hex ? isHex(c) : std::isdigit(static_cast<unsigned char>(c)));
     if (!ok) return "bad integer '" + word + "'";
-    std::string& digits = number.digits;
-    digits.erase(0, std::min(digits.find_first_not_of('0'), digits.size() - 1));
+    const uint64_t base = hex ? 16 : 10, largest = bits == 64 ? UINT64_MAX : UINT32_MAX;
+    uint64_t magnitude = 0;
+    for (char c : digits) {
+        auto digit = static_cast<uint64_t>(std::stoi(std::string(1, c), nullptr, 16));
+        if (magnitude > (largest - digit) / base) return "integer out of range '" + word + "'";
+        magnitude = magnitude * base + digit;
+    }
+    if (negative && magnitude > largest / 2 + 1) return "integer out of range '" + word + "'";
+    value = negative ? 0 - magnitude : magnitude;
     return std::string();
 }
 
 std::string parseInteger(const std::string& word, int64_t& value) {
-    IntegerDigits number;
-    std::string error = scanInteger(word, number);
-    if (!error.empty()) return error;
-    const std::string& digits = number.digits;
-    bool hex = number.hex, negative = number.negative;
-    if (digits.size() > 10) return "integer out of range '" + word + "'";
-    int64_t magnitude = std::stoll(digits, nullptr, hex ? 16 : 10);
-    value = negative ? -magnitude : magnitude;
-    if (value < INT32_MIN || value > static_cast<int64_t>(UINT32_MAX))
-        return "integer out of range '" + word + "'";
-    return std::string();
+    uint64_t bits = 0;
+    std::string error = parseInteger(word, 32, bits);
+    value = static_cast<int64_t>(bits);
+    return error;
 }
 
-Value integerValue(int64_t n) {
-    Value v;
-    v.kind = Value::Kind::Integer;
-    v.integer = n;
-    return v;
-}
-
-std::string parseParameter(const Token& token, Value& value) {
+Argument parseArgument(const Token& token) {
     const std::string& w = token.word;
+    Argument argument;
+    Param& p = argument.value;
+    int64_t n = 0;
     if (token.quoted) {
-        value.kind = Value::Kind::Text;
-        value.text = token.text;
+        p = Param::str(token.text);
     } else if (w == "null") {
-        value.kind = Value::Kind::Null;
+        p = Param::null();
     } else if (w == "result") {
-        value.kind = Value::Kind::LastResult;
+        argument.lastResult = true;
     } else if (w.compare(0, 5, "root:") == 0) {
         std::string number = w.substr(5);
-        if (number.empty() || number[0] == '-' || !parseInteger(number, value.integer).empty())
-            return "bad root index '" + w + "' (root:N takes 0 to 4294967295)";
-        value.kind = Value::Kind::RootKey;
-        value.word = w;
+        if (number.empty() || number[0] == '-' || !parseInteger(number, n).empty())
+            refuse("bad root index '" + w + "' (root:N takes 0 to 4294967295)");
+        p = Param::rootKey(static_cast<uint32_t>(n));
     } else if (looksNumeric(w)) {
-        value.kind = Value::Kind::Integer;
-        return parseInteger(w, value.integer);
+        refuseIf(parseInteger(w, n));
+        p = Param::integerValue(static_cast<int32_t>(static_cast<uint32_t>(n)));
     } else if (rootIndexOf(w) >= 0) {
-        value.kind = Value::Kind::RootKey;
-        value.integer = rootIndexOf(w);
-        value.word = w;
+        p = Param::rootKey(static_cast<uint32_t>(rootIndexOf(w)));
     } else if (w.compare(0, 5, "HKEY_") == 0) {
-        return "unknown root key name '" + w + "'";
+        refuse("unknown root key name '" + w + "'");
     } else {
-        return "stray text '" + w + "'";
+        refuse("stray text '" + w + "'");
     }
-    return std::string();
+    return argument;
+}
+
+uint32_t takeView(Operands& in) {
+    if (in.takeLast("view64")) return KEY_WOW64_64KEY;
+    return in.takeLast("view32") ? KEY_WOW64_32KEY : 0;
+}
+
+uint32_t parseRootName(const Token* token, const std::string& usage) {
+    int index = token && !token->quoted ? rootIndexOf(token->word) : -1;
+    if (index < 0 && token && !token->quoted && token->word.compare(0, 5, "HKEY_") == 0)
+        refuse("unknown root key name '" + token->word + "'");
+    if (index < 0) refuse(usage);
+    return static_cast<uint32_t>(index);
+}
+
+std::vector<uint8_t> parseHex(const std::u16string& text) {
+    std::string ascii;
+    for (char16_t c : text) ascii += c < 0x80 ? static_cast<char>(c) : '?';
+    std::vector<uint8_t> data;
+    for (size_t i = 0; i < ascii.size(); ++i) {
+        if (isBlank(ascii[i])) continue;
+        if (i + 1 >= ascii.size() || !isHex(ascii[i]) || !isHex(ascii[i + 1]))
+            refuse("bad hex bytes '" + ascii +
+                   "' (pairs of hex digits, blanks only between bytes)");
+        data.push_back(static_cast<uint8_t>(std::stoul(ascii.substr(i++, 2), nullptr, 16)));
+    }
+    return data;
+}
+
+std::string hexList(const std::vector<uint8_t>& bytes) {
+    static const char digits[] = "0123456789abcdef";
+    std::string out;
+    for (uint8_t b : bytes) {
+        if (!out.empty()) out += ' ';
+        out += digits[b >> 4];
+        out += digits[b & 15];
+    }
+    return "[" + out + "]";
 }
 
 const char* rootKeyName(uint32_t index) {
     return index < 5 ? RootNames[index] : "";
 }
 
-std::string describe(const Value& value) {
-    switch (value.kind) {
-        case Value::Kind::Null: return "null";
-        case Value::Kind::Text: return quote(value.text);
-        case Value::Kind::Integer: return std::to_string(value.integer);
-        case Value::Kind::Boolean: return value.boolean ? "true" : "false";
-        case Value::Kind::RootKey: return value.word;
-        case Value::Kind::LastResult: return "result";
-        default: return value.word;
-    }
+HKEY rootKeyHandle(uint32_t index) {
+    static const HKEY roots[] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,
+                                 HKEY_CURRENT_CONFIG, HKEY_USERS};
+    return roots[index];
 }
 
 std::string quote(const std::u16string& text) {

@@ -1,4 +1,5 @@
-// Reading a script: lines, their command word, and the command's own parser.
+// Reading a script: lines, their guards and blocks, their command word, and the command's own
+// parser.
 #include <sstream>
 
 #include "script_internal.h"
@@ -24,60 +25,66 @@ std::string wordAt(const std::string& line, size_t pos, size_t* stop) {
     return line.substr(start, *stop - start);
 }
 
-// Parses the line from `pos` into `step`; returns an error, or "" (with an empty command for a
-// line that holds nothing to do). A `layer` before an ordinary command marks that line as one
-// for the portable layer only, a `process32` as one for a 32-bit process's registry view.
-std::string parseLine(const std::string& line, size_t pos, Step& step) {
+// What a line holds: a step, a block's opening or closing brace, or nothing to do.
+struct LineShape {
+    bool step = false;
+    std::string opens;  // "layer" or "process32"
+    bool closes = false;
+};
+
+// Nothing but a comment may follow a brace; `what` names the brace in the message, or is empty
+// for the message of any other stray operand.
+void braceOnly(const std::string& line, size_t pos, const std::string& what) {
+    Operands rest(lex(line, pos));
+    if (what.empty()) rest.end();
+    if (rest.left()) refuse("stray text after " + what);
+}
+
+// Parses the line from `pos` into `step`. A `layer` before an ordinary command marks that line
+// as one for the portable layer only, a `process32` as one for a 32-bit process's registry view.
+void parseLine(const std::string& line, size_t pos, Step& step, LineShape& shape) {
     size_t start = line.find_first_not_of(" \t", pos);
-    if (start == std::string::npos || line[start] == '#') return std::string();
-    size_t stop = 0;
-    step.command = wordAt(line, start, &stop);
-    if (step.command == "layer") {
-        size_t afterVerb = 0, unused = 0;
-        std::string verb = wordAt(line, stop, &afterVerb);
-        if (verb == "layer") return "layer is written once";
-        if (verb == "}") return "} stands alone on its line";
-        if (!verb.empty() && !isLayerVerb(verb, wordAt(line, afterVerb, &unused))) {
-            step.layerOnly = true;
-            return parseLine(line, stop, step);
+    if (start == std::string::npos || line[start] == '#') return;
+    size_t stop = 0, next = 0, unused = 0;
+    std::string word = wordAt(line, start, &stop);
+    if (word == "layer") {
+        std::string verb = wordAt(line, stop, &next);
+        if (verb == "layer") refuse("layer is written once");
+        if (verb == "}") refuse("} stands alone on its line");
+        if (verb == "{") {
+            shape.opens = word;
+            return braceOnly(line, next, "");
         }
+        step.layerOnly = true;
+        if (!verb.empty() && !isLayerVerb(verb, wordAt(line, next, &unused)))
+            return parseLine(line, stop, step, shape);
     }
-    if (step.command == "process32") {
-        size_t afterGuard = 0;
-        std::string next = wordAt(line, stop, &afterGuard);
-        if (next == "process32") return "process32 is written once";
-        if (next != "{") {
+    if (word == "process32") {
+        std::string after = wordAt(line, stop, &next);
+        if (after == "process32") refuse("process32 is written once");
+        if (after != "{") {
             step.process32Only = true;
-            return parseLine(line, stop, step);
+            return parseLine(line, stop, step, shape);
         }
-        step.subject = "{";
-        stop = afterGuard;
+        shape.opens = word;
+        return braceOnly(line, next, "process32 {");
     }
-    if (step.command == "}" || step.subject == "{") {
-        std::vector<Token> rest;
-        size_t end = 0;
-        std::string error = lex(line, stop, rest, &end);
-        step.source = step.command == "}" ? "}" : step.command + " {";
-        if (error.empty() && !rest.empty()) error = "stray text after " + step.source;
-        return error;
+    if (word == "}") {
+        shape.closes = true;
+        return braceOnly(line, stop, "}");
     }
-    const Command* command = findCommand(step.command);
-    if (!command) {
-        std::string word = step.command.empty() ? line.substr(start, 1) : step.command;
-        step.command.clear();
-        return "unknown command '" + word + "'";
-    }
-    if (command->rawText) {
-        step.text = line.substr(std::min(line.size(), stop + 1));
+    shape.step = true;
+    if (word == "echo") {  // takes the rest of its line as it is
         step.source = trimmed(line);
-        return command->parse({}, step);
+        step.command = Echo{line.substr(std::min(line.size(), stop + 1))};
+        return;
     }
-    std::vector<Token> tokens;
+    Parser parser = findCommand(word);
+    if (!parser) refuse("unknown command '" + (word.empty() ? line.substr(start, 1) : word) + "'");
     size_t end = 0;
-    std::string error = lex(line, stop, tokens, &end);
-    if (!error.empty()) return error;
+    Operands operands(lex(line, stop, &end));
     step.source = trimmed(line.substr(0, end));
-    return command->parse(tokens, step);
+    step.command = parser(operands);
 }
 
 // An open `layer {` or `process32 {` block: where it began and which guard it puts on its lines.
@@ -86,20 +93,14 @@ struct Block {
     std::string guard;
 };
 
-// Keeps track of `layer {` ... `}` and `process32 {` ... `}`: the lines between them carry the
-// block's guard. Returns an error, or "" with `keep` false for the block's own lines.
-std::string trackBlock(Step& step, Block& block, bool& keep) {
-    bool opens = step.subject == "{" && (step.command == "layer" || step.command == "process32");
-    keep = !opens && step.command != "}";
-    if (opens && block.line)
-        return "blocks do not nest (" + block.guard + " { is open since line " +
-               std::to_string(block.line) + ")";
-    if (opens) block = Block{step.line, step.command};
-    if (step.command == "}" && !block.line) return "} without layer { or process32 {";
-    if (step.command == "}") block = Block();
-    if (keep && block.guard == "layer") step.layerOnly = true;
-    if (keep && block.guard == "process32") step.process32Only = true;
-    return std::string();
+// Opens or closes a block at a brace line.
+void trackBlock(const LineShape& shape, int number, Block& block) {
+    if (!shape.opens.empty() && block.line)
+        refuse("blocks do not nest (" + block.guard + " { is open since line " +
+               std::to_string(block.line) + ")");
+    if (!shape.opens.empty()) block = Block{number, shape.opens};
+    if (shape.closes && !block.line) refuse("} without layer { or process32 {");
+    if (shape.closes) block = Block();
 }
 
 }  // namespace
@@ -115,14 +116,18 @@ ParseResult parse(const std::string& file, const std::string& text) {
         if (!line.empty() && line.back() == '\r') line.pop_back();
         Step step;
         step.line = number;
-        std::string error = parseLine(line, 0, step);
-        bool keep = false;
-        if (error.empty() && !step.command.empty()) error = trackBlock(step, block, keep);
-        if (!error.empty()) {
-            result.error = file + ":" + std::to_string(number) + ": " + error;
+        LineShape shape;
+        try {
+            parseLine(line, 0, step, shape);
+            trackBlock(shape, number, block);
+        } catch (const Refusal& refusal) {
+            result.error = file + ":" + std::to_string(number) + ": " + refusal.what();
             return result;
         }
-        if (keep) result.script.steps.push_back(std::move(step));
+        if (!shape.step) continue;
+        step.layerOnly = step.layerOnly || block.guard == "layer";
+        step.process32Only = step.process32Only || block.guard == "process32";
+        result.script.steps.push_back(std::move(step));
     }
     if (block.line)
         result.error = file + ":" + std::to_string(block.line) + ": " + block.guard +

@@ -7,76 +7,17 @@
 
 namespace hv::script {
 
-// Bytes as "[61 00 ff]".
-std::string hexList(const std::vector<uint8_t>& bytes) {
-    static const char digits[] = "0123456789abcdef";
-    std::string out;
-    for (uint8_t b : bytes) {
-        if (!out.empty()) out += ' ';
-        out += digits[b >> 4];
-        out += digits[b & 15];
-    }
-    return "[" + out + "]";
-}
-
-// Hex bytes written as pairs of digits, blanks allowed between whole bytes: "01 02ff".
-std::string parseHex(const std::u16string& text, std::vector<uint8_t>& data) {
-    std::string ascii;
-    for (char16_t c : text) ascii += c < 0x80 ? static_cast<char>(c) : '?';
-    std::string bad =
-        "bad hex bytes '" + ascii + "' (pairs of hex digits, blanks only between bytes)";
-    size_t i = 0;
-    while (i < ascii.size()) {
-        if (ascii[i] == ' ' || ascii[i] == '\t') {
-            ++i;
-            continue;
-        }
-        if (i + 1 >= ascii.size() || !std::isxdigit(static_cast<unsigned char>(ascii[i])) ||
-            !std::isxdigit(static_cast<unsigned char>(ascii[i + 1])))
-            return bad;
-        data.push_back(static_cast<uint8_t>(std::stoul(ascii.substr(i, 2), nullptr, 16)));
-        i += 2;
-    }
-    return std::string();
-}
-
 namespace {
 
-// The operands of a line, read front to back.
-class Operands {
-public:
-    explicit Operands(const std::vector<Token>& tokens) : tokens_(tokens), end_(tokens.size()) {}
-    bool atEnd() const { return at_ >= end_; }
-    const Token* peek() const { return atEnd() ? nullptr : &tokens_[at_]; }
-    // The next operand when it is a bare word, else "" (nothing is taken).
-    std::string word() {
-        const Token* t = peek();
-        if (!t || t->quoted) return std::string();
-        ++at_;
-        return t->word;
-    }
-    // The next operand when it is a quoted text.
-    bool text(std::u16string& out) {
-        const Token* t = peek();
-        if (!t || !t->quoted) return false;
-        out = t->text;
-        ++at_;
-        return true;
-    }
-    // Leaves the last operand out of the reading.
-    void dropLast() { --end_; }
-    // The message for the first operand left over, or "" when none is.
-    std::string rest() const {
-        const Token* t = peek();
-        if (!t) return std::string();
-        return "stray text '" + (t->quoted ? quote(t->text) : t->word) + "'";
-    }
+using Form = Registry::Form;
 
-private:
-    const std::vector<Token>& tokens_;
-    size_t at_ = 0;
-    size_t end_;
-};
+// The forms as lines write them after `reg`, in the order of Registry::Form.
+const char* const FormNames[] = {"key create",   "key delete", "value set",
+                                 "value delete", "expect key", "expect value"};
+
+std::string formName(Form form) {
+    return FormNames[static_cast<size_t>(form)];
+}
 
 struct TypeName {
     const char* word;  // as scripts write it
@@ -113,165 +54,94 @@ void appendText(std::vector<uint8_t>& data, const std::u16string& text) {
     data.push_back(0);
 }
 
-void appendLittleEndian(std::vector<uint8_t>& data, uint64_t value, int bytes) {
-    for (int i = 0; i < bytes; ++i) data.push_back(static_cast<uint8_t>(value >> (8 * i)));
-}
-
-
-// A 64-bit integer: decimal from -9223372036854775808 to 18446744073709551615, or 0x with up
-// to sixteen hex digits.
-std::string parseInteger64(const std::string& word, uint64_t& value) {
-    IntegerDigits number;
-    std::string error = scanInteger(word, number);
-    if (!error.empty()) return error;
-    const std::string& digits = number.digits;
-    bool hex = number.hex, negative = number.negative;
-    bool fits = hex ? digits.size() <= 16
-                    : digits.size() < 20 ||
-                          (digits.size() == 20 && digits <= "18446744073709551615");
-    if (!fits) return "integer out of range '" + word + "'";
-    unsigned long long magnitude = std::stoull(digits, nullptr, hex ? 16 : 10);
-    if (negative && magnitude > 0x8000000000000000ull) return "integer out of range '" + word + "'";
-    value = negative ? 0 - static_cast<uint64_t>(magnitude) : static_cast<uint64_t>(magnitude);
-    return std::string();
-}
-
 // The type word of `bytes`: a name of TypeNames or a 32-bit number.
-std::string parseTypeWord(const std::string& word, uint32_t& type) {
+uint32_t parseTypeWord(const std::string& word) {
     for (const TypeName& t : TypeNames)
-        if (word == t.word) {
-            type = t.type;
-            return std::string();
-        }
+        if (word == t.word) return t.type;
     int64_t number = 0;
     if (word.empty() || !std::isdigit(static_cast<unsigned char>(word[0])) ||
         !parseInteger(word, number).empty())
-        return "unknown value type '" + word +
+        refuse("unknown value type '" + word +
                "' (none, sz, expand_sz, binary, dword, dword_be, link, multi_sz, qword or a "
-               "number)";
-    type = static_cast<uint32_t>(number);
-    return std::string();
+               "number)");
+    return static_cast<uint32_t>(number);
 }
 
-// sz and expand_sz take one text, multi_sz a list; each text is stored with its terminator.
-std::string parseTexts(Operands& in, const std::string& kind, RegistryLine& reg) {
+// The data of a value: a type word and what that type takes. sz and expand_sz take one text,
+// multi_sz a list, each stored with its terminator; dword a 32-bit integer, qword a 64-bit one,
+// stored little-endian; binary hex bytes; bytes a type and hex bytes, for data no other form
+// writes.
+void parseData(Operands& in, Registry& reg) {
+    std::string kind = in.word();
     std::u16string text;
     if (kind == "multi_sz") {
         reg.type = REG_MULTI_SZ;
         while (in.text(text)) appendText(reg.data, text);
         appendText(reg.data, u"");  // the empty text that ends the list
-        return std::string();
-    }
-    if (!in.text(text)) return kind + " needs one text in quotes";
-    reg.type = kind == "sz" ? REG_SZ : REG_EXPAND_SZ;
-    appendText(reg.data, text);
-    return std::string();
-}
-
-// dword takes a 32-bit integer, qword a 64-bit one; both are stored little-endian.
-std::string parseNumber(Operands& in, const std::string& kind, RegistryLine& reg) {
-    std::string number = in.word();
-    if (number.empty()) return kind + " needs an integer";
-    uint64_t value = 0;
-    std::string error;
-    if (kind == "dword") {
-        int64_t dword = 0;
-        error = parseInteger(number, dword);
-        value = static_cast<uint64_t>(dword);
+    } else if (kind == "sz" || kind == "expand_sz") {
+        reg.type = kind == "sz" ? REG_SZ : REG_EXPAND_SZ;
+        appendText(reg.data, in.text(kind + " needs one text in quotes"));
+    } else if (kind == "dword" || kind == "qword") {
+        std::string number = in.word();
+        if (number.empty()) refuse(kind + " needs an integer");
+        int bits = kind == "dword" ? 32 : 64;
+        uint64_t value = 0;
+        reg.type = bits == 32 ? REG_DWORD : REG_QWORD;
+        refuseIf(parseInteger(number, bits, value));
+        for (int i = 0; i < bits / 8; ++i)
+            reg.data.push_back(static_cast<uint8_t>(value >> (8 * i)));
+    } else if (kind == "binary" || kind == "bytes") {
+        std::string type = kind == "bytes" ? in.word() : "binary";
+        if (type.empty()) refuse("bytes needs a value type and hex bytes in quotes");
+        reg.type = parseTypeWord(type);
+        reg.data = parseHex(in.text(kind + " needs hex bytes in quotes"));
     } else {
-        error = parseInteger64(number, value);
+        refuse("reg " + formName(reg.form) + " needs " +
+               (reg.form == Form::ExpectValue ? "missing or " : "") +
+               "a value type: sz, expand_sz, multi_sz, dword, qword, binary or bytes" +
+               (kind.empty() ? std::string() : ", not '" + kind + "'"));
     }
-    reg.type = kind == "dword" ? REG_DWORD : REG_QWORD;
-    appendLittleEndian(reg.data, value, kind == "dword" ? 4 : 8);
-    return error;
 }
 
-// binary takes hex bytes; bytes takes a type and hex bytes, for data no other form writes.
-std::string parseBytes(Operands& in, const std::string& kind, RegistryLine& reg) {
-    reg.type = REG_BINARY;
-    if (kind == "bytes") {
-        std::string type = in.word();
-        if (type.empty()) return "bytes needs a value type and hex bytes in quotes";
-        if (std::string error = parseTypeWord(type, reg.type); !error.empty()) return error;
-    }
-    std::u16string hex;
-    if (!in.text(hex)) return kind + " needs hex bytes in quotes";
-    return parseHex(hex, reg.data);
-}
-
-// The data of a value: a type word and what that type takes.
-std::string parseData(Operands& in, const std::string& form, RegistryLine& reg) {
-    std::string kind = in.word();
-    reg.hasData = true;
-    if (kind == "sz" || kind == "expand_sz" || kind == "multi_sz")
-        return parseTexts(in, kind, reg);
-    if (kind == "dword" || kind == "qword") return parseNumber(in, kind, reg);
-    if (kind == "binary" || kind == "bytes") return parseBytes(in, kind, reg);
-    return "reg " + form + " needs " + (form == "expect value" ? "missing or " : "") +
-           "a value type: sz, expand_sz, multi_sz, dword, qword, binary or bytes" +
-           (kind.empty() ? std::string() : ", not '" + kind + "'");
-}
-
-// The root key, key path and (for values) the value name of a line.
-std::string parsePlace(Operands& in, const std::string& form, RegistryLine& reg, bool value) {
-    const Token* t = in.peek();
-    bool bare = t && !t->quoted;
-    Value root;
-    std::string error = bare ? parseParameter(*t, root) : std::string();
-    if (!error.empty() && t->word.compare(0, 5, "HKEY_") == 0) return error;
-    if (!bare || !error.empty() || root.kind != Value::Kind::RootKey ||
-        root.word.compare(0, 5, "root:") == 0)
-        return "reg " + form + " needs a root key name (HKEY_CURRENT_USER ...)";
-    in.word();
-    reg.root = static_cast<uint32_t>(root.integer);
-    if (!in.text(reg.path)) return "reg " + form + " needs a key path in quotes";
-    if (value && !in.text(reg.name)) return "reg " + form + " needs a value name in quotes";
-    return std::string();
-}
-
-// Takes a view word off the end of the line: view64 or view32.
-void takeView(const std::vector<Token>& operands, Operands& in, RegistryLine& reg) {
-    if (operands.empty() || operands.back().quoted) return;
-    const std::string& w = operands.back().word;
-    if (w == "view64") reg.view = KEY_WOW64_64KEY;
-    if (w == "view32") reg.view = KEY_WOW64_32KEY;
-    if (reg.view) in.dropLast();
-}
-
-// The forms after `reg`, as "key create", "value set", "expect key" ...
-std::string parseForm(Operands& in, Step& step) {
+// The forms after `reg`: "key create", "value set", "expect key" ...
+Form parseForm(Operands& in) {
     std::string first = in.word();
     if (first == "expect") {
         std::string what = in.word();
-        if (what != "key" && what != "value") return "reg expect takes key or value";
-        step.subject = "expect " + what;
-        return std::string();
+        if (what != "key" && what != "value") refuse("reg expect takes key or value");
+        return what == "key" ? Form::ExpectKey : Form::ExpectValue;
     }
-    if (first != "key" && first != "value") return "reg takes key, value or expect";
+    if (first != "key" && first != "value") refuse("reg takes key, value or expect");
     std::string verb = in.word();
     const char* verbs = first == "key" ? "create" : "set";
     if (verb != verbs && verb != "delete")
-        return "reg " + first + " takes " + verbs + " or delete";
-    step.subject = first + " " + verb;
-    return std::string();
+        refuse("reg " + first + " takes " + verbs + " or delete");
+    bool remove = verb == "delete";
+    return first == "key" ? (remove ? Form::DeleteKey : Form::CreateKey)
+                          : (remove ? Form::DeleteValue : Form::SetValue);
 }
 
 // The key as messages name it: HKEY_CURRENT_USER "Software\\X" view64.
-std::string keyText(const RegistryLine& reg) {
-    std::string view = reg.view == KEY_WOW64_64KEY   ? " view64"
-                       : reg.view == KEY_WOW64_32KEY ? " view32"
+std::string keyText(const RegistryKey& key) {
+    std::string view = key.view == KEY_WOW64_64KEY   ? " view64"
+                       : key.view == KEY_WOW64_32KEY ? " view32"
                                                      : "";
-    return std::string(rootKeyName(reg.root)) + " " + quote(reg.path) + view;
+    return std::string(rootKeyName(key.root)) + " " + quote(key.path) + view;
 }
 
-std::string valueText(const RegistryLine& reg) {
-    return "value " + quote(reg.name) + " of " + keyText(reg);
+std::string valueText(const Registry& reg) {
+    return "value " + quote(reg.name) + " of " + keyText(reg.key);
 }
 
-// A registry call's failure, as a line reports it.
-bool callFailed(Session& session, const Step& step, const char* function, LONG code) {
-    return session.fail(step, "reg " + step.subject + ": " + function + " gave " +
-                                  std::to_string(code) + " for " + keyText(step.registry));
+// Refuses with a registry call's failure, as a line reports it.
+[[noreturn]] void callFailed(const Registry& reg, const char* function, LONG code) {
+    refuse("reg " + formName(reg.form) + ": " + function + " gave " + std::to_string(code) +
+           " for " + keyText(reg.key));
+}
+
+// Opens the key in the line's view with `rights`: 0, 2 for a missing key, or another failure.
+LONG openKey(const RegistryKey& key, REGSAM rights, HKEY* handle) {
+    return RegOpenKeyExW(rootKeyHandle(key.root), wide(key.path), 0, key.view | rights, handle);
 }
 
 // Deletes a key with everything below it, deepest keys first, in the line's view. Each key is
@@ -294,100 +164,82 @@ LONG deleteTree(HKEY parent, const std::u16string& path, REGSAM view, const char
     return view ? RegDeleteKeyExW(parent, wide(path), view, 0) : RegDeleteKeyW(parent, wide(path));
 }
 
-bool createKey(Session& session, const Step& step) {
-    const RegistryLine& reg = step.registry;
+// No rights are asked for: the line only makes sure that the key is there.
+void createKey(Session& session, const Step& step, const Registry& reg) {
     HKEY key = nullptr;
     DWORD disposition = 0;
-    // No rights are asked for: the line only makes sure that the key is there.
-    LONG result = RegCreateKeyExW(rootKeyHandle(reg.root), wide(reg.path), 0, nullptr, 0, reg.view,
-                                  nullptr, &key, &disposition);
-    if (result != ERROR_SUCCESS) return callFailed(session, step, "RegCreateKeyExW", result);
+    LONG result = RegCreateKeyExW(rootKeyHandle(reg.key.root), wide(reg.key.path), 0, nullptr, 0,
+                                  reg.key.view, nullptr, &key, &disposition);
+    if (result != ERROR_SUCCESS) callFailed(reg, "RegCreateKeyExW", result);
     RegCloseKey(key);
     session.show(step, disposition == REG_CREATED_NEW_KEY ? "created" : "was there");
-    return true;
 }
 
-// Opens the key in the line's view with `rights`: 0, 2 for a missing key, or another failure.
-LONG openKey(const RegistryLine& reg, REGSAM rights, HKEY* key) {
-    return RegOpenKeyExW(rootKeyHandle(reg.root), wide(reg.path), 0, reg.view | rights, key);
-}
-
-bool deleteKey(Session& session, const Step& step) {
-    const RegistryLine& reg = step.registry;
+void deleteKey(Session& session, const Step& step, const Registry& reg) {
     HKEY key = nullptr;
-    LONG result = openKey(reg, 0, &key);
+    LONG result = openKey(reg.key, 0, &key);
     if (result == ERROR_FILE_NOT_FOUND) {
-        session.show(step, "was not there");
-        return true;
+        return session.show(step, "was not there");
     }
     if (result == ERROR_SUCCESS) RegCloseKey(key);
     const char* failed = "";
-    result = deleteTree(rootKeyHandle(reg.root), reg.path, reg.view, &failed);
-    if (result != ERROR_SUCCESS) return callFailed(session, step, failed, result);
+    result = deleteTree(rootKeyHandle(reg.key.root), reg.key.path, reg.key.view, &failed);
+    if (result != ERROR_SUCCESS) callFailed(reg, failed, result);
     session.show(step, "deleted");
-    return true;
 }
 
 // Writes the value's bytes exactly: two nonzero bytes follow them in memory, since Windows adds
 // a terminator to a string whose size leaves it out when the next character happens to be zero.
-bool setValue(Session& session, const Step& step) {
-    const RegistryLine& reg = step.registry;
+void setValue(Session& session, const Step& step, const Registry& reg) {
     HKEY key = nullptr;
-    LONG result = RegCreateKeyExW(rootKeyHandle(reg.root), wide(reg.path), 0, nullptr, 0,
-                                  reg.view | KEY_SET_VALUE, nullptr, &key, nullptr);
-    if (result != ERROR_SUCCESS) return callFailed(session, step, "RegCreateKeyExW", result);
+    LONG result = RegCreateKeyExW(rootKeyHandle(reg.key.root), wide(reg.key.path), 0, nullptr, 0,
+                                  reg.key.view | KEY_SET_VALUE, nullptr, &key, nullptr);
+    if (result != ERROR_SUCCESS) callFailed(reg, "RegCreateKeyExW", result);
     std::vector<uint8_t> padded(reg.data);
     padded.insert(padded.end(), {0xFF, 0xFF, 0xFF});
     result = RegSetValueExW(key, wide(reg.name), 0, reg.type, padded.data(),
                             static_cast<DWORD>(reg.data.size()));
     RegCloseKey(key);
-    if (result != ERROR_SUCCESS) return callFailed(session, step, "RegSetValueExW", result);
-    session.show(step, "written: " + typeName(reg.type) + ", " +
-                           std::to_string(reg.data.size()) + " bytes");
-    return true;
+    if (result != ERROR_SUCCESS) callFailed(reg, "RegSetValueExW", result);
+    session.show(
+        step, "written: " + typeName(reg.type) + ", " + std::to_string(reg.data.size()) + " bytes");
 }
 
-bool deleteValue(Session& session, const Step& step) {
-    const RegistryLine& reg = step.registry;
+void deleteValue(Session& session, const Step& step, const Registry& reg) {
     HKEY key = nullptr;
-    LONG result = RegOpenKeyExW(rootKeyHandle(reg.root), wide(reg.path), 0,
-                                reg.view | KEY_SET_VALUE, &key);
+    LONG result = openKey(reg.key, KEY_SET_VALUE, &key);
     if (result == ERROR_SUCCESS) {
         result = RegDeleteValueW(key, wide(reg.name));
         RegCloseKey(key);
         if (result != ERROR_SUCCESS && result != ERROR_FILE_NOT_FOUND)
-            return callFailed(session, step, "RegDeleteValueW", result);
+            callFailed(reg, "RegDeleteValueW", result);
     } else if (result != ERROR_FILE_NOT_FOUND) {
-        return callFailed(session, step, "RegOpenKeyExW", result);
+        callFailed(reg, "RegOpenKeyExW", result);
     }
     session.show(step, result == ERROR_SUCCESS ? "deleted" : "was not there");
-    return true;
 }
 
-bool expectKey(const Step& step, std::string& why) {
-    const RegistryLine& reg = step.registry;
+// Why the key is not as expected, or "".
+std::string keyWhy(const Registry& reg) {
     HKEY key = nullptr;
-    LONG result = openKey(reg, 0, &key);
+    LONG result = openKey(reg.key, 0, &key);
     if (result == ERROR_SUCCESS) RegCloseKey(key);
-    if (result != ERROR_SUCCESS && result != ERROR_FILE_NOT_FOUND) {
-        why = "cannot tell whether the key " + keyText(reg) +
-              " exists: RegOpenKeyExW gave " + std::to_string(result);
-        return false;
-    }
+    if (result != ERROR_SUCCESS && result != ERROR_FILE_NOT_FOUND)
+        return "cannot tell whether the key " + keyText(reg.key) + " exists: RegOpenKeyExW gave " +
+               std::to_string(result);
     bool exists = result == ERROR_SUCCESS;
-    if (exists == reg.exists) return true;
-    why = "expected the key " + keyText(reg) + (reg.exists ? " to exist" : " to be missing") +
-          (exists ? ", it exists" : ", it is missing");
-    return false;
+    if (exists == reg.exists) return std::string();
+    return "expected the key " + keyText(reg.key) + (reg.exists ? " to exist" : " to be missing") +
+           (exists ? ", it exists" : ", it is missing");
 }
 
 // Reads a value's type and bytes; 0, 2 when the key or the value is missing, or another code
 // with the failing function in `failed`.
-LONG readValue(const RegistryLine& reg, uint32_t& type, std::vector<uint8_t>& data,
+LONG readValue(const Registry& reg, uint32_t& type, std::vector<uint8_t>& data,
                const char** failed) {
     HKEY key = nullptr;
     *failed = "RegOpenKeyExW";
-    LONG result = openKey(reg, KEY_QUERY_VALUE, &key);
+    LONG result = openKey(reg.key, KEY_QUERY_VALUE, &key);
     if (result != ERROR_SUCCESS) return result;
     *failed = "RegQueryValueExW";
     DWORD size = 0, kind = 0;
@@ -403,75 +255,63 @@ LONG readValue(const RegistryLine& reg, uint32_t& type, std::vector<uint8_t>& da
     return result;
 }
 
-bool expectValue(const Step& step, std::string& why) {
-    const RegistryLine& reg = step.registry;
+// Why the value is not as expected, or "".
+std::string valueWhy(const Registry& reg) {
     uint32_t type = 0;
     std::vector<uint8_t> data;
     const char* failed = "";
     LONG result = readValue(reg, type, data, &failed);
-    if (result != ERROR_SUCCESS && result != ERROR_FILE_NOT_FOUND) {
-        why = "cannot read the " + valueText(reg) + ": " + failed + " gave " +
-              std::to_string(result);
-        return false;
-    }
-    std::string wanted = reg.hasData ? typeName(reg.type) + " " + hexList(reg.data) : "none";
-    std::string found = result == ERROR_SUCCESS ? typeName(type) + " " + hexList(data)
-                        : std::string(failed) == "RegOpenKeyExW" ? "no key"
-                                                                 : "no value";
-    bool same = reg.hasData ? result == ERROR_SUCCESS && type == reg.type && data == reg.data
-                            : result != ERROR_SUCCESS;
-    if (!same) why = "expected the " + valueText(reg) + " to be " + wanted + ", found " + found;
-    return same;
+    if (result != ERROR_SUCCESS && result != ERROR_FILE_NOT_FOUND)
+        return "cannot read the " + valueText(reg) + ": " + failed + " gave " +
+               std::to_string(result);
+    bool found = result == ERROR_SUCCESS;
+    if (reg.exists ? found && type == reg.type && data == reg.data : !found) return std::string();
+    std::string wanted = reg.exists ? typeName(reg.type) + " " + hexList(reg.data) : "none";
+    std::string seen = found ? typeName(type) + " " + hexList(data)
+                       : std::string(failed) == "RegOpenKeyExW" ? "no key"
+                                                                : "no value";
+    return "expected the " + valueText(reg) + " to be " + wanted + ", found " + seen;
 }
 
 }  // namespace
 
-HKEY rootKeyHandle(uint32_t index) {
-    static const HKEY roots[] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,
-                                 HKEY_CURRENT_CONFIG, HKEY_USERS};
-    return roots[index];
-}
-
-std::string parseRegistry(const std::vector<Token>& operands, Step& step) {
-    Operands in(operands);
-    RegistryLine& reg = step.registry;
-    takeView(operands, in, reg);
-    if (std::string error = parseForm(in, step); !error.empty()) return error;
-    const std::string& form = step.subject;
-    if (form == "expect key") {
+Command parseRegistry(Operands& in) {
+    Registry reg;
+    reg.key.view = takeView(in);
+    reg.form = parseForm(in);
+    std::string form = "reg " + formName(reg.form);
+    if (reg.form == Form::ExpectKey) {
         std::string state = in.word();
         if (state != "exists" && state != "missing")
-            return "reg expect key takes exists or missing";
+            refuse("reg expect key takes exists or missing");
         reg.exists = state == "exists";
     }
-    bool value = form == "value set" || form == "value delete" || form == "expect value";
-    if (std::string error = parsePlace(in, form, reg, value); !error.empty()) return error;
-    if (form == "expect value") {
-        const Token* t = in.peek();
-        if (t && !t->quoted && t->word == "missing") {
-            in.word();
-            reg.exists = false;
-        } else if (std::string error = parseData(in, form, reg); !error.empty()) {
-            return error;
-        }
+    reg.key.root =
+        parseRootName(in.next(), form + " needs a root key name (HKEY_CURRENT_USER ...)");
+    reg.key.path = in.text(form + " needs a key path in quotes");
+    if (reg.form == Form::SetValue || reg.form == Form::DeleteValue ||
+        reg.form == Form::ExpectValue)
+        reg.name = in.text(form + " needs a value name in quotes");
+    const Token* t = in.peek();
+    if (reg.form == Form::ExpectValue && t && !t->quoted && t->word == "missing") {
+        in.word();
+        reg.exists = false;
+    } else if (reg.form == Form::ExpectValue || reg.form == Form::SetValue) {
+        parseData(in, reg);
     }
-    if (form == "value set")
-        if (std::string error = parseData(in, form, reg); !error.empty()) return error;
-    return in.rest();
+    in.end();
+    return reg;
 }
 
-bool runRegistry(Session& session, const Step& step) {
-    const std::string& form = step.subject;
-    if (form == "key create") return createKey(session, step);
-    if (form == "key delete") return deleteKey(session, step);
-    if (form == "value set") return setValue(session, step);
-    if (form == "value delete") return deleteValue(session, step);
-    ++session.expectations;
-    std::string why;
-    bool ok = form == "expect key" ? expectKey(step, why) : expectValue(step, why);
-    if (!ok) return session.fail(step, why);
-    session.show(step, "ok");
-    return true;
+void run(Session& session, const Step& step, const Registry& reg) {
+    switch (reg.form) {
+        case Form::CreateKey: return createKey(session, step, reg);
+        case Form::DeleteKey: return deleteKey(session, step, reg);
+        case Form::SetValue: return setValue(session, step, reg);
+        case Form::DeleteValue: return deleteValue(session, step, reg);
+        case Form::ExpectKey: return session.checked(step, keyWhy(reg));
+        default: return session.checked(step, valueWhy(reg));
+    }
 }
 
 }  // namespace hv::script

@@ -4,6 +4,7 @@
 #include <iomanip>
 #include <iterator>
 #include <stdexcept>
+#include <type_traits>
 
 #include "script_internal.h"
 
@@ -22,14 +23,13 @@ void Session::freshInstance() {
     instance_ = std::make_unique<Instance>(module_);
 }
 
-bool Session::fail(const Step& step, const std::string& message) {
+void Session::fail(const Step& step, const std::string& message) {
     out.flush();  // keeps the transcript before the message when both go to one terminal
     err_ << file_ << ":" << step.line << ": " << message << std::endl;
-    return false;
 }
 
 void Session::show(const Step& step, const std::string& detail) {
-    bool event = step.command == "cnd" || step.command == "act" || step.command == "exp";
+    bool event = std::holds_alternative<Event>(step.command);
     out << std::setw(5) << step.line << "  " << (event ? "" : "  ") << step.source;
     out << "   " << detail << '\n';
 }
@@ -39,24 +39,51 @@ void Session::skip(const Step& step, const std::string& why) {
     show(step, "skipped " + why);
 }
 
+void Session::checked(const Step& step, const std::string& why) {
+    ++expectations;
+    refuseIf(why);
+    show(step, "ok");
+}
+
+const Outcome& Session::lastEvent() const {
+    if (!last_) refuse("expect with no event before it");
+    return *last_;
+}
+
 void Session::remember(EventKind kind, Outcome outcome) {
     lastKind_ = kind;
     last_ = std::move(outcome);
 }
 
-#ifdef _WIN32
-const bool LayerBuilt = false;
-#else
-const bool LayerBuilt = true;
-#endif
+namespace {
+
 // The registry's default view is a 32-bit process's: the portable layer's model, which plays
 // the process the module ships for, and 32-bit Windows.
 const bool DefaultView32 = LayerBuilt || sizeof(void*) == 4;
 
+// Why a build without the layer's test control skips a line.
+template <typename T>
+std::string layerSkipNote(const T&) {
+    if constexpr (std::is_base_of_v<LayerControl, T>)
+        return std::string("needs the portable layer's ") + T::needs;
+    else
+        return "holds only with the portable layer";
+}
+
+// A build without the layer skips the layer's own lines before they run, and has no run
+// functions for them.
+template <typename T>
+void runLine(Session& session, const Step& step, const T& line) {
+    if constexpr (std::is_base_of_v<LayerControl, T> && !LayerBuilt)
+        refuse("this build has no portable layer");
+    else
+        run(session, step, line);
+}
+
+}  // namespace
+
 Runner::Runner(Module& module, std::ostream& out, std::ostream& err)
     : module_(module), out_(out), err_(err), layer_(LayerBuilt) {}
-
-Runner::~Runner() = default;
 
 void Runner::setLayer(bool present) {
     layer_ = present && LayerBuilt;
@@ -78,16 +105,15 @@ bool Runner::run(const Script& script) {
             continue;
         }
         if (step.layerOnly && !layer_) {
-            session->skip(step, "under Windows: " + layerSkipNote(step));
+            std::string why =
+                std::visit([](const auto& l) { return layerSkipNote(l); }, step.command);
+            session->skip(step, "under Windows: " + why);
             continue;
         }
-        bool passed = false;
         try {
-            passed = findCommand(step.command)->run(*session, step);
+            std::visit([&](const auto& l) { runLine(*session, step, l); }, step.command);
         } catch (const std::exception& e) {
-            passed = session->fail(step, e.what());
-        }
-        if (!passed) {
+            session->fail(step, e.what());
             undoLayer(*session);
             out_ << "== " << script.file << ": FAILED at line " << step.line << "\n\n";
             return false;

@@ -1,5 +1,6 @@
 // The host's side of an instance's saved state and debugger lines, and the reader of state
 // files that hivelet-host dump-state uses.
+#include <algorithm>
 #include <atomic>
 #include <filesystem>
 #include <fstream>
@@ -18,39 +19,22 @@ using DebugItemEntry = void(WINAPI*)(LPWSTR line, void* record, int item);
 const char16_t LineFill = 0xBEBE;
 const size_t HeaderBytes = 12;
 
-// A file handle the host owns for one call of the module.
-class HostFile {
-public:
-    HostFile(const std::string& path, bool writing) {
-        std::u16string name = fromUtf8(path);
-        handle_ = CreateFileW(wide(name), writing ? GENERIC_WRITE : GENERIC_READ,
-                              FILE_SHARE_READ, nullptr, writing ? CREATE_ALWAYS : OPEN_EXISTING,
-                              FILE_ATTRIBUTE_NORMAL, nullptr);
-        if (handle_ == INVALID_HANDLE_VALUE)
-            error_ = "cannot open " + path + " (error " + std::to_string(GetLastError()) + ")";
-    }
-    ~HostFile() {
-        if (handle_ != INVALID_HANDLE_VALUE) CloseHandle(handle_);
-    }
-    HostFile(const HostFile&) = delete;
-    HostFile& operator=(const HostFile&) = delete;
-    HANDLE handle() const { return handle_; }
-    const std::string& error() const { return error_; }
-
-private:
-    HANDLE handle_ = INVALID_HANDLE_VALUE;
-    std::string error_;
-};
-
+// Calls SaveRunObject or LoadRunObject with a handle on the file that the host opens for it and
+// closes after; -1, and why in `error`, when the file cannot be opened.
 int runState(Module& module, const char* entry, void* record, const std::string& path,
              bool writing, std::string* error) {
     auto call = module.entry<StateEntry>(entry);
-    HostFile file(path, writing);
-    if (file.handle() == INVALID_HANDLE_VALUE) {
-        if (error) *error = file.error();
+    HANDLE file = CreateFileW(wide(fromUtf8(path)), writing ? GENERIC_WRITE : GENERIC_READ,
+                              FILE_SHARE_READ, nullptr, writing ? CREATE_ALWAYS : OPEN_EXISTING,
+                              FILE_ATTRIBUTE_NORMAL, nullptr);
+    if (file == INVALID_HANDLE_VALUE) {
+        if (error)
+            *error = "cannot open " + path + " (error " + std::to_string(GetLastError()) + ")";
         return -1;
     }
-    return call(record, file.handle()) ? 1 : 0;
+    int result = call(record, file) ? 1 : 0;
+    CloseHandle(file);
+    return result;
 }
 
 // A fresh file name in the system's temporary folder; test programs run side by side, so the
@@ -99,12 +83,7 @@ int Instance::loadState(const std::vector<uint8_t>& bytes) {
 }
 
 std::u16string Instance::DebugLine::text() const {
-    std::u16string t;
-    for (char16_t c : buffer) {
-        if (c == 0) break;
-        t += c;
-    }
-    return t;
+    return std::u16string(buffer.begin(), std::find(buffer.begin(), buffer.end(), u'\0'));
 }
 
 Instance::DebugLine Instance::debugLine(int item) {

@@ -7,13 +7,12 @@
 
 namespace {
 
-using hv::script::Step;
-using hv::script::Value;
-using Kind = hv::script::Value::Kind;
+using namespace hv::script;
+using hv::Param;
 
 // The steps of a script that must parse.
 std::vector<Step> steps(const std::string& text) {
-    hv::script::ParseResult r = hv::script::parse("t.hvs", text);
+    ParseResult r = parse("t.hvs", text);
     EXPECT_TRUE(r.ok()) << r.error;
     return r.script.steps;
 }
@@ -23,53 +22,70 @@ Step only(const std::string& line) {
     return s.size() == 1 ? s[0] : Step{};
 }
 
+// The line of a step, of the kind the test expects; a step of another kind fails the test.
+template <typename T>
+T as(const Step& step) {
+    const T* line = std::get_if<T>(&step.command);
+    EXPECT_TRUE(line) << "line " << step.line << ": " << step.source;
+    return line ? *line : T{};
+}
+
+// The parameters of an event line.
+std::vector<Param> params(const std::string& line) {
+    std::vector<Param> out;
+    for (const Argument& a : as<Event>(only(line)).arguments) out.push_back(a.value);
+    return out;
+}
+
 TEST(ScriptParser, TextEscapes) {
-    Step s = only(R"(act ActSetCurrentKey "a\\b\"c\n\r\t\u20AC\u00e9 # kept")");
-    ASSERT_EQ(s.values.size(), 1u);
-    EXPECT_EQ(s.values[0].kind, Kind::Text);
-    EXPECT_EQ(s.values[0].text, u"a\\b\"c\n\r\t\u20AC\u00e9 # kept");
-    Step utf8 = only("act ActSetCurrentKey \"Software\\\\Caf\xC3\xA9 \xF0\x9F\x90\x9D\"");
-    EXPECT_EQ(utf8.values[0].text, u"Software\\Caf\u00e9 \U0001F41D");
-    EXPECT_EQ(hv::script::quote(u"a\\\"\r\n\x01\U0001F41D"),
-              "\"a\\\\\\\"\\r\\n\\u0001\xF0\x9F\x90\x9D\"");
+    std::vector<Param> p = params(R"(act ActSetCurrentKey "a\\b\"c\n\r\t\u20AC\u00e9 # kept")");
+    ASSERT_EQ(p.size(), 1u);
+    EXPECT_EQ(p[0].kind, Param::Kind::Text);
+    EXPECT_EQ(p[0].text, u"a\\b\"c\n\r\t\u20AC\u00e9 # kept");
+    p = params("act ActSetCurrentKey \"Software\\\\Caf\xC3\xA9 \xF0\x9F\x90\x9D\"");
+    EXPECT_EQ(p[0].text, u"Software\\Caf\u00e9 \U0001F41D");
+    EXPECT_EQ(quote(u"a\\\"\r\n\x01\U0001F41D"), "\"a\\\\\\\"\\r\\n\\u0001\xF0\x9F\x90\x9D\"");
 }
 
 TEST(ScriptParser, ParameterKinds) {
-    Step s = only("act ActSetDword HKEY_CURRENT_USER null \"\" -2147483648");
-    ASSERT_EQ(s.values.size(), 4u);
-    EXPECT_EQ(s.values[0].kind, Kind::RootKey);
-    EXPECT_EQ(s.values[0].integer, 2);
-    EXPECT_EQ(s.values[1].kind, Kind::Null);
-    EXPECT_EQ(s.values[2].kind, Kind::Text);
-    EXPECT_EQ(s.values[2].text, u"");
-    EXPECT_EQ(s.values[3].integer, INT32_MIN);
-    EXPECT_EQ(s.kind, hv::EventKind::Action);
-    EXPECT_EQ(s.code, 4);
+    Event e = as<Event>(only("act ActSetDword HKEY_CURRENT_USER null \"\" -2147483648"));
+    EXPECT_EQ(e.kind, hv::EventKind::Action);
+    EXPECT_EQ(e.code, 4);
+    ASSERT_EQ(e.arguments.size(), 4u);
+    EXPECT_EQ(e.arguments[0].value.kind, Param::Kind::RootKey);
+    EXPECT_EQ(e.arguments[0].value.rootIndex, 2u);
+    EXPECT_EQ(e.arguments[1].value.kind, Param::Kind::Null);
+    EXPECT_EQ(e.arguments[2].value.kind, Param::Kind::Text);
+    EXPECT_EQ(e.arguments[2].value.text, u"");
+    EXPECT_EQ(e.arguments[3].value.integer, INT32_MIN);
+    EXPECT_FALSE(e.arguments[3].lastResult);
+    EXPECT_TRUE(as<Event>(only("act ActSetCurrentKey result")).arguments[0].lastResult);
 }
 
+// Integers above 2147483647 wrap to negative 32-bit values.
 TEST(ScriptParser, IntegersAndRootIndices) {
-    const std::pair<const char*, int64_t> table[] = {{"0", 0},
+    const std::pair<const char*, int32_t> table[] = {{"0", 0},
                                                      {"2", 2},
                                                      {"-1", -1},
                                                      {"0x10", 16},
                                                      {"0XfF", 255},
-                                                     {"0xFFFFFFFF", 0xFFFFFFFF},
-                                                     {"4294967295", 4294967295},
+                                                     {"0xFFFFFFFF", -1},
+                                                     {"4294967295", -1},
+                                                     {"2147483648", INT32_MIN},
                                                      {"-2147483648", INT32_MIN},
                                                      {"000000000007", 7}};
     for (auto [text, value] : table) {
-        Step s = only(std::string("act ActSet64BitMode ") + text);
-        ASSERT_EQ(s.values.size(), 1u) << text;
-        EXPECT_EQ(s.values[0].kind, Kind::Integer) << text;
-        EXPECT_EQ(s.values[0].integer, value) << text;
+        std::vector<Param> p = params(std::string("act ActSet64BitMode ") + text);
+        ASSERT_EQ(p.size(), 1u) << text;
+        EXPECT_EQ(p[0].kind, Param::Kind::Integer) << text;
+        EXPECT_EQ(p[0].integer, value) << text;
     }
     const char* const names[] = {"HKEY_CLASSES_ROOT", "HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER",
                                  "HKEY_CURRENT_CONFIG", "HKEY_USERS"};
-    for (int i = 0; i < 5; ++i)
-        EXPECT_EQ(only(std::string("act ActSetRootKey ") + names[i]).values[0].integer, i);
-    EXPECT_EQ(only("act ActSetRootKey root:7").values[0].integer, 7);
-    EXPECT_EQ(only("act ActSetRootKey root:0xFFFFFFFF").values[0].integer, 0xFFFFFFFF);
-    EXPECT_EQ(only("act ActSetCurrentKey result").values[0].kind, Kind::LastResult);
+    for (uint32_t i = 0; i < 5; ++i)
+        EXPECT_EQ(params(std::string("act ActSetRootKey ") + names[i])[0].rootIndex, i);
+    EXPECT_EQ(params("act ActSetRootKey root:7")[0].rootIndex, 7u);
+    EXPECT_EQ(params("act ActSetRootKey root:0xFFFFFFFF")[0].rootIndex, 0xFFFFFFFFu);
 }
 
 TEST(ScriptParser, ExpectationForms) {
@@ -77,20 +93,28 @@ TEST(ScriptParser, ExpectationForms) {
         "expect \"x\"\nexpect 5\nexpect true\nexpect false\nexpect error 40\n"
         "expect message 0\nexpect fetches 4\nexpect buffers\nexpect buffers 1024 8\n"
         "expect address currentKey\nexpect rootKeyIndex 4\nexpect currentKey null\n"
-        "expect currentKey \"k\"\nexpect use64BitView 1\nexpect result \"y\"\n");
-    ASSERT_EQ(s.size(), 15u);
-    const char* const subjects[] = {"result",     "result",       "result",       "result",
-                                    "error",      "message",      "fetches",      "buffers",
-                                    "buffers",    "address",      "rootKeyIndex", "currentKey",
-                                    "currentKey", "use64BitView", "result"};
-    for (size_t i = 0; i < s.size(); ++i) EXPECT_EQ(s[i].subject, subjects[i]) << "line " << i + 1;
-    EXPECT_EQ(s[2].values[0].kind, Kind::Boolean);
-    EXPECT_TRUE(s[2].values[0].boolean);
-    EXPECT_FALSE(s[3].values[0].boolean);
-    EXPECT_TRUE(s[7].values.empty());
-    EXPECT_EQ(s[8].values.size(), 2u);
-    EXPECT_EQ(s[11].values[0].kind, Kind::Null);
-    EXPECT_EQ(s[14].values[0].text, u"y");
+        "expect currentKey \"k\"\nexpect use64BitView 1\nexpect result \"y\"\n"
+        "expect debug 1 untouched\nexpect file \"f\" \"01\"\n");
+    ASSERT_EQ(s.size(), 17u);
+    EXPECT_EQ(std::get<std::u16string>(as<ExpectResult>(s[0]).value), u"x");
+    EXPECT_EQ(std::get<int64_t>(as<ExpectResult>(s[1]).value), 5);
+    EXPECT_TRUE(std::get<bool>(as<ExpectResult>(s[2]).value));
+    EXPECT_FALSE(std::get<bool>(as<ExpectResult>(s[3]).value));
+    const std::pair<size_t, ExpectNumber::Of> numbers[] = {{4, ExpectNumber::Of::LastError},
+                                                           {5, ExpectNumber::Of::Message},
+                                                           {6, ExpectNumber::Of::Fetches},
+                                                           {10, ExpectNumber::Of::RootKeyIndex},
+                                                           {13, ExpectNumber::Of::Use64BitView}};
+    for (auto [index, of] : numbers) EXPECT_EQ(as<ExpectNumber>(s[index]).of, of) << index;
+    EXPECT_EQ(as<ExpectNumber>(s[4]).value, 40);
+    EXPECT_TRUE(as<ExpectBuffers>(s[7]).sizes.empty());
+    EXPECT_EQ(as<ExpectBuffers>(s[8]).sizes, (std::vector<size_t>{1024, 8}));
+    EXPECT_EQ(as<ExpectAddress>(s[9]).place, hv::Outcome::TextSource::CurrentKey);
+    EXPECT_FALSE(as<ExpectCurrentKey>(s[11]).key);
+    EXPECT_EQ(as<ExpectCurrentKey>(s[12]).key, u"k");
+    EXPECT_EQ(std::get<std::u16string>(as<ExpectResult>(s[14]).value), u"y");
+    EXPECT_FALSE(as<ExpectDebug>(s[15]).text);
+    EXPECT_TRUE(as<FileBytes>(s[16]).check);
 }
 
 // Line numbers count every line; comments, blank lines, CR LF endings and a BOM are ignored;
@@ -102,11 +126,11 @@ TEST(ScriptParser, LinesCommentsAndEcho) {
     ASSERT_EQ(s.size(), 5u);
     EXPECT_EQ(s[0].line, 3);
     EXPECT_EQ(s[0].source, "act ActSetRootKey HKEY_USERS");
-    EXPECT_EQ(s[1].text, "say \"hi\" # not a comment");
-    EXPECT_EQ(s[2].command, "new");
-    EXPECT_EQ(s[3].subject, "off");
-    EXPECT_EQ(s[4].subject, "rootKeyIndex");
-    EXPECT_EQ(s[4].values[0].integer, 9);
+    EXPECT_EQ(as<Echo>(s[1]).text, "say \"hi\" # not a comment");
+    as<New>(s[2]);
+    EXPECT_FALSE(as<Buffers>(s[3]).lend);
+    EXPECT_EQ(as<Poke>(s[4]).offset, hv::hostLayout.rootKeyIndex);
+    EXPECT_EQ(as<Poke>(s[4]).value, 9u);
 }
 
 // The bytes a registry line stores or expects, for comparisons.
@@ -147,13 +171,15 @@ TEST(ScriptParser, RegistryValueData) {
     };
     for (const Row& row : table) {
         SCOPED_TRACE(row.data);
-        Step s = only(std::string("reg value set HKEY_USERS \"k\" \"v\" ") + row.data);
-        EXPECT_EQ(s.subject, "value set");
-        EXPECT_TRUE(s.registry.hasData);
-        EXPECT_EQ(s.registry.type, row.type);
-        EXPECT_EQ(s.registry.data, row.bytes);
-        Step e = only(std::string("reg expect value HKEY_USERS \"k\" \"v\" ") + row.data);
-        EXPECT_EQ(e.registry.data, row.bytes);
+        Registry set =
+            as<Registry>(only(std::string("reg value set HKEY_USERS \"k\" \"v\" ") + row.data));
+        EXPECT_EQ(set.form, Registry::Form::SetValue);
+        EXPECT_EQ(set.type, row.type);
+        EXPECT_EQ(set.data, row.bytes);
+        Registry e =
+            as<Registry>(only(std::string("reg expect value HKEY_USERS \"k\" \"v\" ") + row.data));
+        EXPECT_TRUE(e.exists);
+        EXPECT_EQ(e.data, row.bytes);
     }
 }
 
@@ -167,29 +193,31 @@ TEST(ScriptParser, RegistryLinePlacesAndViews) {
         "reg expect value HKEY_CURRENT_USER \"k\" \"v\" missing\n"
         "reg expect value HKEY_CURRENT_USER \"k\" \"v\" dword 1 view32\n");
     ASSERT_EQ(s.size(), 7u);
-    const char* const subjects[] = {"key create",   "key delete",   "value delete", "expect key",
-                                    "expect key",   "expect value", "expect value"};
+    using Form = Registry::Form;
+    const Form forms[] = {Form::CreateKey, Form::DeleteKey,   Form::DeleteValue, Form::ExpectKey,
+                          Form::ExpectKey, Form::ExpectValue, Form::ExpectValue};
+    std::vector<Registry> r;
     for (size_t i = 0; i < s.size(); ++i) {
-        EXPECT_EQ(s[i].command, "reg") << "line " << i + 1;
-        EXPECT_EQ(s[i].subject, subjects[i]) << "line " << i + 1;
+        r.push_back(as<Registry>(s[i]));
+        EXPECT_EQ(r[i].form, forms[i]) << "line " << i + 1;
         EXPECT_FALSE(s[i].layerOnly) << "line " << i + 1;
     }
-    EXPECT_EQ(s[0].registry.root, 2u);
-    EXPECT_EQ(s[0].registry.path, u"Software\\A");
-    EXPECT_EQ(s[0].registry.view, 0u);
-    EXPECT_EQ(s[1].registry.root, 1u);
-    EXPECT_EQ(s[1].registry.view, static_cast<uint32_t>(KEY_WOW64_64KEY));
+    EXPECT_EQ(r[0].key.root, 2u);
+    EXPECT_EQ(r[0].key.path, u"Software\\A");
+    EXPECT_EQ(r[0].key.view, 0u);
+    EXPECT_EQ(r[1].key.root, 1u);
+    EXPECT_EQ(r[1].key.view, static_cast<uint32_t>(KEY_WOW64_64KEY));
     EXPECT_EQ(s[1].source, "reg key delete HKEY_LOCAL_MACHINE \"SOFTWARE\\\\A\" view64");
-    EXPECT_EQ(s[2].registry.root, 0u);
-    EXPECT_EQ(s[2].registry.name, u"");
-    EXPECT_EQ(s[2].registry.view, static_cast<uint32_t>(KEY_WOW64_32KEY));
-    EXPECT_EQ(s[3].registry.root, 3u);
-    EXPECT_TRUE(s[3].registry.exists);
-    EXPECT_FALSE(s[4].registry.exists);
-    EXPECT_FALSE(s[5].registry.exists);
-    EXPECT_FALSE(s[5].registry.hasData);
-    EXPECT_TRUE(s[6].registry.exists);
-    EXPECT_EQ(s[6].registry.view, static_cast<uint32_t>(KEY_WOW64_32KEY));
+    EXPECT_EQ(r[2].key.root, 0u);
+    EXPECT_EQ(r[2].name, u"");
+    EXPECT_EQ(r[2].key.view, static_cast<uint32_t>(KEY_WOW64_32KEY));
+    EXPECT_EQ(r[3].key.root, 3u);
+    EXPECT_TRUE(r[3].exists);
+    EXPECT_FALSE(r[4].exists);
+    EXPECT_FALSE(r[5].exists);
+    EXPECT_TRUE(r[5].data.empty());
+    EXPECT_TRUE(r[6].exists);
+    EXPECT_EQ(r[6].key.view, static_cast<uint32_t>(KEY_WOW64_32KEY));
 }
 
 // `layer` before a command marks that line; `layer {` ... `}` marks every line between; the
@@ -218,28 +246,26 @@ TEST(ScriptParser, LayerLinesAndBlocks) {
         bool marked = i != 11 && i != 14;
         EXPECT_EQ(s[i].layerOnly, marked) << "step " << i;
     }
-    EXPECT_EQ(s[0].subject, "deny");
-    EXPECT_EQ(s[0].registry.path, u"k");
-    EXPECT_EQ(s[0].registry.view, static_cast<uint32_t>(KEY_WOW64_64KEY));
-    EXPECT_EQ(s[0].values[0].integer, 0x10000);
-    EXPECT_EQ(s[1].routine, "RegOpenKeyExW");
-    EXPECT_EQ(s[1].values[0].integer, 2);
-    EXPECT_EQ(s[1].values[1].integer, 5);
-    EXPECT_EQ(s[2].values[0].word, "always");
-    EXPECT_EQ(s[3].subject, "hide");
-    EXPECT_EQ(s[4].values[1].integer, 1);
-    EXPECT_EQ(s[5].subject, "expect handles");
-    EXPECT_EQ(s[6].subject, "expect calls");
-    EXPECT_EQ(s[6].values[0].word, "mask");
-    EXPECT_EQ(s[6].values[1].integer, 0xF013F);
-    EXPECT_EQ(s[7].values[0].integer, 3);
-    EXPECT_EQ(s[8].command, "cnd");
-    EXPECT_EQ(s[8].routine, "CndKeyExists");
+    Deny deny = as<Deny>(s[0]);
+    EXPECT_EQ(deny.key.path, u"k");
+    EXPECT_EQ(deny.key.view, static_cast<uint32_t>(KEY_WOW64_64KEY));
+    EXPECT_EQ(deny.rights, 0x10000u);
+    EXPECT_EQ(as<Fail>(s[1]).function, "RegOpenKeyExW");
+    EXPECT_EQ(as<Fail>(s[1]).nth, 2u);
+    EXPECT_EQ(as<Fail>(s[1]).code, 5);
+    EXPECT_EQ(as<Fail>(s[2]).nth, 0u);
+    EXPECT_TRUE(as<Hide>(s[3]).hide);
+    EXPECT_EQ(as<Version>(s[4]).platform, 1u);
+    EXPECT_EQ(as<Handles>(s[5]).count, 0u);
+    EXPECT_TRUE(as<Calls>(s[6]).mask);
+    EXPECT_EQ(as<Calls>(s[6]).number, 0xF013Fu);
+    EXPECT_FALSE(as<Calls>(s[7]).mask);
+    EXPECT_EQ(as<Calls>(s[7]).number, 3u);
+    EXPECT_EQ(as<Event>(s[8]).code, 0);
     EXPECT_EQ(s[8].source, "layer cnd CndKeyExists HKEY_USERS \"\"");
-    EXPECT_EQ(s[9].command, "expect");
-    EXPECT_EQ(s[9].subject, "error");
-    EXPECT_EQ(s[10].text, "only \"here\" # kept");
-    EXPECT_EQ(s[12].command, "reg");
+    EXPECT_EQ(as<ExpectNumber>(s[9]).of, ExpectNumber::Of::LastError);
+    EXPECT_EQ(as<Echo>(s[10]).text, "only \"here\" # kept");
+    as<Registry>(s[12]);
     EXPECT_EQ(s[12].line, 14);
 }
 
@@ -260,7 +286,35 @@ TEST(ScriptParser, Process32LinesAndBlocks) {
         EXPECT_EQ(s[i].layerOnly, layer[i]) << "step " << i;
     }
     EXPECT_EQ(s[0].source, "process32 cnd CndKeyExists HKEY_LOCAL_MACHINE \"SOFTWARE\"");
-    EXPECT_EQ(s[0].routine, "CndKeyExists");
+    EXPECT_EQ(as<Event>(s[0]).code, 0);
+}
+
+// The user's steps of param edit are read once, with their numbers; the checks keep their
+// values.
+TEST(ScriptParser, ParamLines) {
+    std::vector<Step> s = steps(
+        "param edit select 4 double 1 wait 50 ok cancel enter escape close\n"
+        "param record HKEY_USERS\nparam record -1\nparam fill 0xFF\nparam string 64\n"
+        "param expect selection none\nparam expect open yes no\n"
+        "param expect bytes \"10 00 ab\"\n");
+    ASSERT_EQ(s.size(), 8u);
+    using Action = hv::UserStep::Action;
+    const std::pair<Action, int> edit[] = {
+        {Action::Select, 4}, {Action::DoubleClick, 1}, {Action::Wait, 50},  {Action::Ok, 0},
+        {Action::Cancel, 0}, {Action::Enter, 0},       {Action::Escape, 0}, {Action::CloseBox, 0}};
+    std::vector<hv::UserStep> steps = as<ParamEdit>(s[0]).steps;
+    ASSERT_EQ(steps.size(), std::size(edit));
+    for (size_t i = 0; i < steps.size(); ++i) {
+        EXPECT_EQ(steps[i].action, edit[i].first) << i;
+        EXPECT_EQ(steps[i].index, edit[i].second) << i;
+    }
+    EXPECT_EQ(as<ParamRecord>(s[1]).value, 4u);
+    EXPECT_EQ(as<ParamRecord>(s[2]).value, 0xFFFFFFFFu);
+    EXPECT_TRUE(as<ParamRecord>(s[3]).fill);
+    EXPECT_EQ(as<ParamString>(s[4]).capacity, 64);
+    EXPECT_EQ(as<ParamExpect>(s[5]).number, LB_ERR);
+    EXPECT_EQ(as<ParamExpect>(s[6]).flags, (std::vector<bool>{true, false}));
+    EXPECT_EQ(as<ParamExpect>(s[7]).bytes, bytes({0x10, 0, 0xAB}));
 }
 
 // A block left open is reported at its own line; a closing brace needs an open block.
@@ -278,7 +332,7 @@ TEST(ScriptParser, LayerBlockErrors) {
         {"layer {\n} new\n", "t.hvs:2: stray text after }"},
     };
     for (auto [script, message] : table) {
-        hv::script::ParseResult r = hv::script::parse("t.hvs", script);
+        ParseResult r = parse("t.hvs", script);
         EXPECT_EQ(r.error, message) << script;
     }
 }
@@ -390,10 +444,12 @@ const Malformed MalformedLines[] = {
      "reg expect value needs missing or a value type: sz, expand_sz, multi_sz, dword, qword, "
      "binary or bytes"},
     {"reg expect value HKEY_USERS \"k\" \"v\" missing now", "stray text 'now'"},
-    {"layer", "layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
-              "expect handles, expect calls"},
-    {"layer # nothing", "layer needs a command, {, or one of: deny, fail, hide, unhide, version, "
-                        "clear, expect handles, expect calls"},
+    {"layer",
+     "layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
+     "expect handles, expect calls"},
+    {"layer # nothing",
+     "layer needs a command, {, or one of: deny, fail, hide, unhide, version, "
+     "clear, expect handles, expect calls"},
     {"layer layer new", "layer is written once"},
     {"layer }", "} stands alone on its line"},
     {"layer frob", "unknown command 'frob'"},
@@ -427,13 +483,34 @@ const Malformed MalformedLines[] = {
     {"layer expect calls RegOpenKeyExW -1",
      "layer expect calls takes a function and a count, or mask and a mask"},
     {"layer expect calls RegCloseKey mask 1", "RegCloseKey takes no access mask"},
-    {"layer expect calls RegOpenKeyExW mask", "layer expect calls takes a function and a count, or "
-                                              "mask and a mask"},
+    {"layer expect calls RegOpenKeyExW mask",
+     "layer expect calls takes a function and a count, or "
+     "mask and a mask"},
     {"layer expect calls RegOpenKeyExW 1 2", "stray text '2'"},
-    {"layer expect nothing", "expect takes a text, an integer, true, false or one of: error, "
-                               "message, fetches, buffers, address, rootKeyIndex, currentKey, "
-                               "use64BitView, debug, file; not 'nothing'"},
+    {"layer expect nothing",
+     "expect takes a text, an integer, true, false or one of: error, "
+     "message, fetches, buffers, address, rootKeyIndex, currentKey, "
+     "use64BitView, debug, file; not 'nothing'"},
     {"}", "} without layer { or process32 {"},
+    {"layer deny HKEY_NOWHERE \"k\" 1", "unknown root key name 'HKEY_NOWHERE'"},
+    {"param", "param takes init, record, fill, edit, string or expect"},
+    {"param init now", "stray text after param init"},
+    {"param record null", "param record takes a root key name or an index"},
+    {"param string \"5\"", "expected an integer, not \"5\""},
+    {"param fill 1 2", "param fill takes one value"},
+    {"param edit select", "select needs a list position"},
+    {"param edit wait x", "bad integer 'x'"},
+    {"param edit \"ok\"", "a dialog step is a word, not \"ok\""},
+    {"param edit ok frob",
+     "unknown dialog step 'frob' (select N, double N, ok, cancel, enter, "
+     "escape, close or wait MS)"},
+    {"param expect open yes maybe", "open takes yes or no"},
+    {"param expect items \"a\" b", "items takes texts in quotes"},
+    {"param expect bytes \"0 1\"",
+     "bad hex bytes '0 1' (pairs of hex digits, blanks only between bytes)"},
+    {"param expect ranout yes no",
+     "param expect takes index N, result N, selection N|none, items \"...\"..., caption \"...\", "
+     "open yes|no..., ranout yes|no, text \"...\", untouched or bytes \"hex\""},
 };
 
 // Keeps the quotes and backslashes of a row out of the generated test names.

@@ -22,9 +22,6 @@ struct MenuEntry {
     std::vector<MenuEntry> items;   // Popup: its items
 };
 
-// Reads every item of `menu`, nested popups included.
-std::vector<MenuEntry> readMenu(HMENU menu);
-
 // Parameter types of the catalogue.
 namespace paramType {
 constexpr int16_t rootKey = 1000;
@@ -32,9 +29,6 @@ constexpr int16_t text = 45;
 constexpr int16_t integer = 22;
 constexpr int16_t expressionText = 3;
 }  // namespace paramType
-
-// "root key", "text", "integer", "text argument", or the number.
-std::string paramTypeName(int16_t type);
 
 // One event's entry, as the Infos entry point gives it, with the two words before it.
 struct EventEntry {
@@ -48,9 +42,6 @@ struct EventEntry {
 class Catalogue {
 public:
     Catalogue(Module& module, Editor& editor) : module_(module), editor_(editor) {}
-
-    // Events of each kind, from the module's event list: 5 conditions, 13 actions, 8 expressions.
-    static int eventCount(EventKind kind);
 
     // The Menu entry point's popup; the caller destroys it. Null when the module gave none.
     HMENU menu(EventKind kind);
@@ -73,6 +64,8 @@ public:
     // decimal) and %o by the object's name; an expression's parameters follow its name, then
     // the closing parenthesis.
     std::u16string sentence(EventKind kind, int code, const std::vector<Param>& params);
+    // The five identity strings of GetObjInfos: name, maker, copyright, description, web address.
+    std::vector<std::u16string> identity();
 
 private:
     Module& module_;

@@ -7,6 +7,8 @@
 
 #include <windows.h>
 
+#include <cstdint>
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -28,9 +30,6 @@ struct UserStep {
     static UserStep wait(int milliseconds) { return {Action::Wait, milliseconds}; }
 };
 
-// "select 4", "ok", "enter", "close" ...; the words a script writes.
-std::string describe(const UserStep& step);
-
 // What the user saw.
 struct DialogSeen {
     bool appeared = false;
@@ -40,53 +39,14 @@ struct DialogSeen {
     int initialSelection = LB_ERR;      // the list's selection at the first look
     int initialFocus = 0;               // identifier of the control with the focus, 0 if none
     std::vector<bool> openAfter;        // after each step performed: was the dialog still open
-    int lastSelection = LB_ERR;         // the list's selection at the last look
     bool ranOut = false;  // the steps ran out while the dialog was open: the user pressed Cancel
     bool forced = false;  // it stayed open even after Cancel: ended with EndDialog(-2)
-
-    size_t stepsDone() const { return openAfter.size(); }
-    bool closedByLastStep() const { return !openAfter.empty() && !openAfter.back(); }
 };
 
-// Usage: ScriptedUser user({UserStep::select(4), UserStep::ok()});
-//        auto result = user.run([&] { return EditParameter(...); });
-//        user.seen().initialSelection ...
-// One user at a time per thread. `listId` is the control the select steps work on.
-class ScriptedUser {
-public:
-    explicit ScriptedUser(std::vector<UserStep> steps, int listId = 1001);
-    ~ScriptedUser();
-    ScriptedUser(const ScriptedUser&) = delete;
-    ScriptedUser& operator=(const ScriptedUser&) = delete;
-
-    // Runs `showDialog`, which runs a modal dialog on this thread, with the user at work.
-    template <typename F>
-    auto run(F&& showDialog) {
-        start();
-        auto result = showDialog();
-        finish();
-        return result;
-    }
-    // The two halves of run(): set the timer, and after the dialog, stop and conclude.
-    void start();
-    void finish();
-
-    const DialogSeen& seen() const { return seen_; }
-
-private:
-    static void CALLBACK onTick(HWND, UINT, UINT_PTR, DWORD);
-    void tick();
-    void look(HWND dialog);
-    void perform(HWND dialog, const UserStep& step);
-
-    std::vector<UserStep> steps_;
-    int listId_;
-    size_t next_ = 0;
-    UINT_PTR timer_ = 0;
-    HWND dialog_ = nullptr;
-    bool cancelled_ = false;
-    int idleTicks_ = 0;  // ticks left of a Wait step
-    DialogSeen seen_;
-};
+// Calls `showDialog`, which runs a modal dialog on this thread, with the user at work: the user
+// performs `steps` (the select steps on the list box `listId`) and notes in `seen` what it saw.
+// Returns what `showDialog` returned. One user at a time per thread.
+intptr_t withUser(const std::vector<UserStep>& steps, int listId, DialogSeen& seen,
+                  const std::function<intptr_t()>& showDialog);
 
 }  // namespace hv

@@ -132,6 +132,8 @@ const char* kindName(EventKind kind);
 // system, inserts ignored, language 0, at most 512 characters); empty when there is none.
 std::u16string systemMessage(uint32_t code);
 
+class Guarded;
+
 // One object instance: a record of GetRunObjectDataSize bytes with the host's header, created
 // with CreateRunObject and destroyed with DestroyRunObject.
 class Instance {
@@ -154,14 +156,16 @@ public:
     // The record as the module sees it.
     uint8_t* record() { return record_; }
     size_t recordSize() const { return recordSize_; }
-    uint32_t rootKeyIndex() const;
-    const char16_t* currentKey() const;
-    uint32_t lastError() const;
-    uint32_t use64BitView() const;
-    uint16_t headerFlags() const;
-    void setRootKeyIndex(uint32_t value);
-    void setLastError(uint32_t value);
-    void setHeaderFlags(uint16_t value);
+    uint32_t rootKeyIndex() const { return readAt<uint32_t>(record_, hostLayout.rootKeyIndex); }
+    const char16_t* currentKey() const {
+        return readAt<const char16_t*>(record_, hostLayout.currentKey);
+    }
+    uint32_t lastError() const { return readAt<uint32_t>(record_, hostLayout.lastError); }
+    uint32_t use64BitView() const { return readAt<uint32_t>(record_, hostLayout.use64BitView); }
+    uint16_t headerFlags() const { return readAt<uint16_t>(record_, hostLayout.headerFlags); }
+    void setRootKeyIndex(uint32_t value) { writeAt(record_, hostLayout.rootKeyIndex, value); }
+    void setLastError(uint32_t value) { writeAt(record_, hostLayout.lastError, value); }
+    void setHeaderFlags(uint16_t value) { writeAt(record_, hostLayout.headerFlags, value); }
 
     // The saved state through SaveRunObject and LoadRunObject, on a file handle the host opens
     // (CreateFileW) and closes: the entry point's result, or -1 when the file cannot be opened
@@ -186,17 +190,10 @@ public:
     // Host behaviour for the next events: lend no string buffer (GetStringBuffer gives null).
     void lendNoBuffer(bool on) { lendNoBuffer_ = on; }
 
-    // Byte offsets of the module's fields in this build's record.
-    static size_t rootKeyIndexOffset();
-    static size_t currentKeyOffset();
-    static size_t lastErrorOffset();
-    static size_t use64BitViewOffset();
-    static size_t headerFlagsOffset() { return 124; }
-
 private:
     friend struct Services;
     Module& module_;
-    std::vector<uint8_t> storage_;  // record plus sentinels
+    std::unique_ptr<Guarded> block_;  // the record with sentinels around it
     uint8_t* record_ = nullptr;
     size_t recordSize_ = 0;
     std::vector<uint8_t> runHeader_;
@@ -250,7 +247,6 @@ private:
     friend struct EditorServices;
     std::vector<uint8_t> bytes_;
     uint32_t version_ = 0x02000100u | 242u;
-    bool present_ = true;
     unsigned hostVersionCalls_ = 0;
     std::vector<Insert> inserts_;
 };

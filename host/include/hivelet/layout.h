@@ -5,6 +5,8 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
+#include <cstring>
 
 namespace hv {
 
@@ -84,5 +86,18 @@ constexpr HostLayout layoutFor(size_t p) {
 
 // The layout of this build.
 constexpr HostLayout hostLayout = layoutFor(sizeof(void*));
+
+// Reads and writes of host fields at byte offsets; memcpy, since many are not aligned.
+template <typename T>
+T readAt(const uint8_t* base, size_t offset) {
+    T value;
+    std::memcpy(&value, base + offset, sizeof value);
+    return value;
+}
+
+template <typename T>
+void writeAt(uint8_t* base, size_t offset, T value) {
+    std::memcpy(base + offset, &value, sizeof value);
+}
 
 }  // namespace hv

@@ -2,51 +2,224 @@
 // instance and check what comes back. The language is described in docs/scripts.md.
 #pragma once
 
+#include <hivelet/dialog_user.h>
 #include <hivelet/host.h>
 
 #include <iosfwd>
-#include <memory>
+#include <optional>
 #include <string>
+#include <variant>
 #include <vector>
 
 namespace hv::script {
 
-// A value written on a script line.
-struct Value {
-    enum class Kind { Null, Text, Integer, Boolean, RootKey, LastResult, Word };
-    Kind kind = Kind::Null;
-    std::u16string text;   // Text
-    int64_t integer = 0;   // Integer as written (within 32 bits); RootKey: the root index
-    bool boolean = false;  // Boolean
-    std::string word;      // Word: a name the command gives a meaning to; RootKey: as written
+// An event parameter as written: a value for the routine, or `result`.
+struct Argument {
+    Param value;
+    bool lastResult = false;  // `result`: the last text result itself, found when the line runs
 };
 
-// What a registry line (`reg ...`, `layer deny`) works on: a key, a value and its data.
-struct RegistryLine {
-    uint32_t root = 0;          // predefined root: 0 HKEY_CLASSES_ROOT ... 4 HKEY_USERS
-    std::u16string path;        // key path below the root
-    std::u16string name;        // value name
-    uint32_t view = 0;          // KEY_WOW64_64KEY, KEY_WOW64_32KEY, or 0 for the default view
-    bool exists = true;         // reg expect: the key or value must exist (false: be missing)
-    bool hasData = false;       // reg value set / reg expect value with a type and data
-    uint32_t type = 0;          // REG_SZ, REG_DWORD ...
+// cnd, act, exp: runs a routine of the module with its parameters.
+struct Event {
+    EventKind kind = EventKind::Condition;
+    int code = -1;
+    std::vector<Argument> arguments;
+};
+
+// show cnd|act|exp ...: the event as the event sheet shows it; nothing runs.
+struct Show {
+    Event event;
+};
+
+struct Echo {
+    std::string text;
+};
+
+// new: a fresh instance.
+struct New {};
+
+// buffers on|off.
+struct Buffers {
+    bool lend = true;
+};
+
+// poke FIELD N: writes a field of the record at its offset in this build.
+struct Poke {
+    size_t offset = 0;
+    uint32_t value = 0;
+};
+
+// expect [result] VALUE: the last event's result, as written (integers within 32 bits).
+struct ExpectResult {
+    std::variant<int64_t, bool, std::u16string> value;
+};
+
+// expect error|message|fetches|rootKeyIndex|use64BitView N.
+struct ExpectNumber {
+    enum class Of { LastError, Message, Fetches, RootKeyIndex, Use64BitView };
+    Of of = Of::LastError;
+    int64_t value = 0;
+};
+
+// expect buffers N...: the sizes asked of GetStringBuffer, in order.
+struct ExpectBuffers {
+    std::vector<size_t> sizes;
+};
+
+// expect address currentKey|buffer|elsewhere.
+struct ExpectAddress {
+    Outcome::TextSource place = Outcome::TextSource::Elsewhere;
+};
+
+// expect currentKey "text"|null.
+struct ExpectCurrentKey {
+    std::optional<std::u16string> key;
+};
+
+// expect sentence "text": what the last show line printed.
+struct ExpectSentence {
+    std::u16string text;
+};
+
+// expect debug ITEM "text"|untouched.
+struct ExpectDebug {
+    int32_t item = 0;
+    std::optional<std::u16string> text;  // none: the line must stay untouched
+};
+
+// A key as a registry line names it.
+struct RegistryKey {
+    uint32_t root = 0;    // 0 HKEY_CLASSES_ROOT ... 4 HKEY_USERS
+    std::u16string path;  // below the root
+    uint32_t view = 0;    // KEY_WOW64_64KEY, KEY_WOW64_32KEY, or 0 for the default view
+};
+
+// reg ...: sets up or checks the registry through the Win32 registry functions.
+struct Registry {
+    enum class Form { CreateKey, DeleteKey, SetValue, DeleteValue, ExpectKey, ExpectValue };
+    Form form = Form::CreateKey;
+    RegistryKey key;
+    std::u16string name;        // the value's name
+    bool exists = true;         // expect: the key or value must be there (false: be missing)
+    uint32_t type = 0;          // set, and expect value unless missing: REG_SZ, REG_DWORD ...
     std::vector<uint8_t> data;  // the value's bytes exactly as stored
 };
+
+// The lines of the portable layer's own test control; `needs` says why a build without it
+// skips them.
+struct LayerControl {};
+
+struct Deny : LayerControl {
+    static constexpr const char* needs = "access control";
+    RegistryKey key;
+    uint32_t rights = 0;
+};
+
+struct Fail : LayerControl {
+    static constexpr const char* needs = "fault injection";
+    std::string function;
+    unsigned nth = 0;  // 1 for the next call; 0 for every call
+    long code = 0;
+};
+
+// layer clear.
+struct Clear : LayerControl {
+    static constexpr const char* needs = "fault injection";
+};
+
+// layer hide|unhide NAME.
+struct Hide : LayerControl {
+    static constexpr const char* needs = "hidden exports";
+    std::string name;
+    bool hide = true;
+};
+
+// layer version fail|normal|platform N.
+struct Version : LayerControl {
+    static constexpr const char* needs = "GetVersionExW settings";
+    enum class How { Fail, Normal, Platform };
+    How how = How::Normal;
+    uint32_t platform = 0;
+};
+
+// layer expect handles N.
+struct Handles : LayerControl {
+    static constexpr const char* needs = "handle count";
+    size_t count = 0;
+};
+
+// layer expect calls FUNCTION N | FUNCTION mask M.
+struct Calls : LayerControl {
+    static constexpr const char* needs = "call journal";
+    std::string function;
+    bool mask = false;
+    uint64_t number = 0;  // the count, or the mask every call must carry
+};
+
+// save "FILE" / load "FILE".
+struct StateFile {
+    bool save = true;
+    std::string path;
+};
+
+// file "FILE" "hex" writes the bytes; expect file "FILE" "hex" checks them.
+struct FileBytes {
+    bool check = false;
+    std::string path;
+    std::vector<uint8_t> bytes;
+};
+
+// debug: both debugger lines.
+struct Debug {};
+
+// param fill BYTE / param record ROOT|N.
+struct ParamRecord {
+    bool fill = false;
+    uint32_t value = 0;
+};
+
+struct ParamInit {};
+
+struct ParamEdit {
+    std::vector<UserStep> steps;
+};
+
+struct ParamString {
+    Slot capacity = 0;
+};
+
+// param expect ...: what the last param edit or param string left.
+struct ParamExpect {
+    enum class What {
+        Index,
+        Bytes,
+        Result,
+        Selection,
+        Items,
+        Caption,
+        Open,
+        RanOut,
+        Text,
+        Untouched
+    };
+    What what = What::Index;
+    int64_t number = 0;                 // index, result, selection (LB_ERR: none)
+    std::vector<uint8_t> bytes;         // bytes
+    std::vector<std::u16string> texts;  // items, caption, text
+    std::vector<bool> flags;            // open, ranout
+};
+
+using Command =
+    std::variant<Event, Show, Echo, New, Buffers, Poke, ExpectResult, ExpectNumber, ExpectBuffers,
+                 ExpectAddress, ExpectCurrentKey, ExpectSentence, ExpectDebug, Registry, Deny, Fail,
+                 Clear, Hide, Version, Handles, Calls, StateFile, FileBytes, Debug, ParamRecord,
+                 ParamInit, ParamEdit, ParamString, ParamExpect>;
 
 // One line of a script, parsed.
 struct Step {
     int line = 0;
-    std::string source;   // the line without its comment, trimmed
-    std::string command;  // the line's first word
-    // Events (cnd, act, exp): the routine and its parameters.
-    EventKind kind = EventKind::Condition;
-    int code = -1;
-    std::string routine;
-    // What a command checks or changes (expect, poke): "result" when an expectation names none.
-    std::string subject;
-    std::vector<Value> values;  // event parameters, or the command's operands
-    std::string text;           // echo
-    RegistryLine registry;      // reg, and layer deny
+    std::string source;  // the line without its comment, trimmed
+    Command command;
     // Runs only against the portable Win32 layer (a `layer` line, or a line in a layer block);
     // a Windows build skips it with a note.
     bool layerOnly = false;
@@ -78,7 +251,6 @@ std::string quote(const std::u16string& text);
 class Runner {
 public:
     Runner(Module& module, std::ostream& out, std::ostream& err);
-    ~Runner();
     // Runs a parsed script; true when every line passed.
     bool run(const Script& script);
     // Reads, parses and runs a script file; true when every line passed.
