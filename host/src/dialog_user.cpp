@@ -21,20 +21,15 @@ thread_local User* activeUser = nullptr;
 // The tick period, in milliseconds: a user that needs a few ticks finishes in well under a second.
 const UINT TickPeriod = 10;
 
-std::u16string windowText(HWND window) {
+// A window's text or class name, as `get` (GetWindowTextW or GetClassNameW) gives it.
+std::u16string textOf(HWND window, int(WINAPI* get)(HWND, LPWSTR, int) = GetWindowTextW) {
     WCHAR buffer[256] = {};
-    int n = GetWindowTextW(window, buffer, 256);
-    return std::u16string(reinterpret_cast<const char16_t*>(buffer), n > 0 ? n : 0);
-}
-
-std::u16string className(HWND window) {
-    WCHAR buffer[64] = {};
-    int n = GetClassNameW(window, buffer, 64);
+    int n = get(window, buffer, 256);
     return std::u16string(reinterpret_cast<const char16_t*>(buffer), n > 0 ? n : 0);
 }
 
 BOOL CALLBACK findDialog(HWND window, LPARAM found) {
-    if (className(window) != u"#32770") return TRUE;
+    if (textOf(window, GetClassNameW) != u"#32770") return TRUE;
     *reinterpret_cast<HWND*>(found) = window;
     return FALSE;
 }
@@ -86,8 +81,8 @@ void clickItem(HWND dialog, int listId, int index, bool twice) {
 void look(User& user, HWND dialog) {
     DialogSeen& seen = user.seen;
     seen.appeared = true;
-    seen.caption = windowText(dialog);
-    seen.className = className(dialog);
+    seen.caption = textOf(dialog);
+    seen.className = textOf(dialog, GetClassNameW);
     if (HWND list = GetDlgItem(dialog, user.listId)) {
         seen.items = listItems(list);
         seen.initialSelection = static_cast<int>(SendMessageW(list, LB_GETCURSEL, 0, 0));

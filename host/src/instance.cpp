@@ -190,18 +190,6 @@ void Instance::layOutHeader() {
     writeAt(record_, l.runHeader, static_cast<void*>(runHeader_.data()));
 }
 
-Outcome Instance::condition(int code, const std::vector<Param>& params) {
-    return run(EventKind::Condition, code, params);
-}
-
-Outcome Instance::action(int code, const std::vector<Param>& params) {
-    return run(EventKind::Action, code, params);
-}
-
-Outcome Instance::expression(int code, const std::vector<Param>& params) {
-    return run(EventKind::Expression, code, params);
-}
-
 Outcome Instance::run(EventKind kind, int code, const std::vector<Param>& params) {
     Slot routine = routineAt(kind, code);
     Outcome outcome;
@@ -325,10 +313,12 @@ size_t Instance::locateText(const uint8_t* p, Outcome& outcome) const {
     return LongestText;
 }
 
-// Every block the module could have written where it must not, this event's and the last one's.
+// Every block the module could have written where it must not, this event's and the last one's:
+// the guards around the record first, then the header bytes the module must leave alone.
 void Instance::checkSentinels(Outcome& outcome) {
     std::vector<std::string> damage;
-    std::string record = damageToRecord();
+    std::string record = block_->damage();
+    if (record.empty()) record = damageToHeader();
     if (!record.empty()) damage.push_back(record);
     long changed = firstDifference(runHeader_.data(), runHeaderSealed_.data(), runHeader_.size());
     if (changed >= 0)
@@ -344,14 +334,8 @@ void Instance::checkSentinels(Outcome& outcome) {
     for (const std::string& d : damage) outcome.damage += (outcome.damage.empty() ? "" : "; ") + d;
 }
 
-// The guards around the record, the header bytes the module must leave alone, and the header
-// flags, of which the module may only set StringResultFlag.
-std::string Instance::damageToRecord() const {
-    std::string damage = block_->damage();
-    return damage.empty() ? damageToHeader() : damage;
-}
-
-// Header bytes compared with their state before the event; flags may only gain bits.
+// Header bytes compared with their state before the event; of the header flags, the module may
+// only set StringResultFlag.
 std::string Instance::damageToHeader() const {
     const std::vector<uint8_t>& was = event_->headerBefore;
     size_t flags = hostLayout.headerFlags, rest = flags + sizeof(uint16_t);

@@ -76,13 +76,12 @@ Command parseBuffers(Operands& in) {
 // poke FIELD INTEGER: the record fields a script may overwrite, as a loaded saved state could.
 Command parsePoke(Operands& in) {
     const std::pair<const char*, size_t> fields[] = {{"rootKeyIndex", hostLayout.rootKeyIndex},
-                                                     {"lastError", hostLayout.lastError},
-                                                     {"use64BitView", hostLayout.use64BitView}};
+                                                     {"lastError", hostLayout.lastError}};
     std::string field = in.word();
     Poke poke;
     for (auto [name, offset] : fields)
         if (field == name) poke.offset = offset;
-    if (!poke.offset) refuse("poke takes rootKeyIndex, lastError or use64BitView and an integer");
+    if (!poke.offset) refuse("poke takes rootKeyIndex or lastError and an integer");
     if (in.left() > 1 && !in.peek()->quoted) refuse("stray text after poke " + field);
     poke.value = static_cast<uint32_t>(in.integer("poke " + field + " needs an integer"));
     return poke;
@@ -136,9 +135,9 @@ Parser findCommand(const std::string& name) {
 // Runs an event line, shows it, and fails on damage or misuse whatever the script expects.
 void run(Session& session, const Step& step, const Event& line) {
     std::vector<Param> params = resolve(session, line.arguments);
-    size_t mark = session.layer ? journalMark() : 0;
+    size_t mark = journalMark();
     Outcome outcome = session.instance().run(line.kind, line.code, params);
-    if (session.layer) session.eventCalls = journalSince(mark);
+    session.eventCalls = {mark, journalMark()};
     ++session.events;
     session.show(step, "=> " + resultText(line.kind, outcome) + "   (lastError " +
                            std::to_string(session.instance().lastError()) + ")");

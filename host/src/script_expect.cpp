@@ -16,10 +16,9 @@ int64_t oneInteger(Operands& in, const std::string& what, bool count) {
     return value;
 }
 
-// expect [result] VALUE: a text, true, false or an integer.
+// expect VALUE: a text, true, false or an integer.
 Command parseResult(Operands& in) {
     const Token* t = in.next();
-    if (!t) refuse("expect result needs a value");
     in.end();
     ExpectResult line;
     int64_t n = 0;
@@ -88,7 +87,6 @@ Command parseDebug(Operands& in) {
 }
 
 const std::pair<const char*, Parser> Subjects[] = {
-    {"result", parseResult},
     {"buffers", parseBuffers},
     {"address", parseAddress},
     {"currentKey", parseCurrentKey},
@@ -118,14 +116,13 @@ std::string got(Session& s) {
 // Why the last event did not return exactly this text, or "".
 std::string textWhy(Session& s, const std::u16string& wanted, const std::string& what) {
     const Outcome& o = s.lastEvent();
-    return o.isText && o.text == wanted ? "" : "expected " + what + ", got " + got(s);
+    return unless(o.isText && o.text == wanted, what, got(s));
 }
 
 // A 32-bit field or count against the expected value.
 std::string numberWhy(const char* what, int64_t wanted, uint64_t actual) {
-    if (static_cast<uint64_t>(static_cast<uint32_t>(wanted)) == actual) return std::string();
-    return std::string("expected ") + what + " " + std::to_string(wanted) + ", got " +
-           std::to_string(actual);
+    return unless(static_cast<uint64_t>(static_cast<uint32_t>(wanted)) == actual,
+                  what + (" " + std::to_string(wanted)), std::to_string(actual));
 }
 
 // Integers compare at the width of the routine's result: 16 bits for actions, 32 otherwise.
@@ -133,16 +130,15 @@ std::string resultWhy(Session& s, const ExpectResult& line) {
     const Outcome& o = s.lastEvent();
     if (auto* text = std::get_if<std::u16string>(&line.value))
         return textWhy(s, *text, quote(*text));
-    if (auto* truth = std::get_if<bool>(&line.value)) {
-        if (s.lastKind() == EventKind::Condition && o.asCondition() == (*truth ? 1 : 0)) return "";
-        return std::string("expected ") + (*truth ? "true" : "false") + ", got " + got(s);
-    }
+    if (auto* truth = std::get_if<bool>(&line.value))
+        return unless(s.lastKind() == EventKind::Condition && o.asCondition() == (*truth ? 1 : 0),
+                      *truth ? "true" : "false", got(s));
     int64_t n = std::get<int64_t>(line.value);
     auto wanted = static_cast<uint32_t>(n);
     bool same = s.lastKind() == EventKind::Action
                     ? static_cast<uint16_t>(o.asAction()) == static_cast<uint16_t>(wanted)
                     : !o.isText && static_cast<uint32_t>(o.asInteger()) == wanted;
-    return same ? "" : "expected " + std::to_string(n) + ", got " + got(s);
+    return unless(same, std::to_string(n), got(s));
 }
 
 // The system's message is asked for here, so the check holds for every system's texts.
@@ -224,9 +220,8 @@ void run(Session& s, const Step& step, const ExpectNumber& line) {
 
 void run(Session& s, const Step& step, const ExpectBuffers& line) {
     const std::vector<size_t>& asked = s.lastEvent().bufferRequests;
-    s.checked(step, asked == line.sizes ? ""
-                                        : "expected buffer requests " + listed(line.sizes) +
-                                              ", got " + listed(asked));
+    s.checked(step,
+              unless(asked == line.sizes, "buffer requests " + listed(line.sizes), listed(asked)));
 }
 
 void run(Session& s, const Step& step, const ExpectAddress& line) {
@@ -242,27 +237,22 @@ void run(Session& s, const Step& step, const ExpectAddress& line) {
 void run(Session& s, const Step& step, const ExpectCurrentKey& line) {
     const char16_t* key = s.instance().currentKey();
     bool same = line.key ? key && *line.key == key : key == nullptr;
-    s.checked(step, same ? ""
-                         : "expected currentKey " + (line.key ? quote(*line.key) : "null") +
-                               ", got " + (key ? quote(key) : "null"));
+    s.checked(step, unless(same, "currentKey " + (line.key ? quote(*line.key) : "null"),
+                           key ? quote(key) : "null"));
 }
 
 void run(Session& s, const Step& step, const ExpectSentence& line) {
     if (!s.sentence) refuse("expect sentence with no show line before it");
-    s.checked(step, *s.sentence == line.text ? ""
-                                             : "expected the sentence " + quote(line.text) +
-                                                   ", got " + quote(*s.sentence));
+    s.checked(step, unless(*s.sentence == line.text, "the sentence " + quote(line.text),
+                           quote(*s.sentence)));
 }
 
 void run(Session& s, const Step& step, const ExpectDebug& line) {
     Instance::DebugLine shown = s.instance().debugLine(line.item);
     if (!shown.sentinelsIntact) refuse("GetDebugItem wrote past the 256-character line");
     bool same = line.text ? lineIs(shown, *line.text) : !shown.written;
-    s.checked(step, same ? ""
-                         : "expected the debugger line " +
-                               (line.text ? quote(*line.text) + " padded with zeros"
-                                          : "buffer untouched") +
-                               ", got " + shownLine(shown));
+    std::string wanted = line.text ? quote(*line.text) + " padded with zeros" : "buffer untouched";
+    s.checked(step, unless(same, "the debugger line " + wanted, shownLine(shown)));
 }
 
 // debug: both lines of the debugger.

@@ -26,6 +26,11 @@ inline void refuseIf(const std::string& error) {
     if (!error.empty()) refuse(error);
 }
 
+// Why an expectation does not hold: "" when it holds, else "expected WANTED, got GOT".
+inline std::string unless(bool holds, const std::string& wanted, const std::string& got) {
+    return holds ? std::string() : "expected " + wanted + ", got " + got;
+}
+
 // A token of a line: a quoted text (escapes resolved) or a bare word.
 struct Token {
     bool quoted = false;
@@ -99,12 +104,6 @@ Parser findCommand(const std::string& name);
 // the word after it.
 bool isLayerVerb(const std::string& word, const std::string& next);
 
-// A call the portable layer served during an event, from its journal.
-struct LayerCall {
-    std::string function;
-    std::vector<uint64_t> args;
-};
-
 // What a script's layer lines changed, so that it can be undone when the script ends.
 struct LayerChanges {
     bool faults = false;
@@ -144,7 +143,7 @@ public:
     unsigned expectations = 0;
     unsigned skipped = 0;
     const bool layer;                   // the portable layer's test control is there
-    std::vector<LayerCall> eventCalls;  // what the layer served during the last event
+    std::pair<size_t, size_t> eventCalls;  // the layer's journal entries of the last event
     std::optional<std::u16string> sentence;  // what the last `show` line printed
     LayerChanges layerChanges;
 
@@ -175,7 +174,6 @@ void run(Session& s, const Step& step, const ExpectDebug& line);
 void run(Session& s, const Step& step, const Registry& line);
 void run(Session& s, const Step& step, const Deny& line);
 void run(Session& s, const Step& step, const Fail& line);
-void run(Session& s, const Step& step, const Clear& line);
 void run(Session& s, const Step& step, const Hide& line);
 void run(Session& s, const Step& step, const Version& line);
 void run(Session& s, const Step& step, const Handles& line);
@@ -189,9 +187,9 @@ void run(Session& s, const Step& step, const ParamEdit& line);
 void run(Session& s, const Step& step, const ParamString& line);
 void run(Session& s, const Step& step, const ParamExpect& line);
 
-// Marks where the layer's journal stands, and reads what it served since the mark.
+// Where the layer's journal stands (0 without the layer): the calls an event made lie between
+// the marks before and after it.
 size_t journalMark();
-std::vector<LayerCall> journalSince(size_t mark);
 // Undoes what the script's layer lines armed: faults, version settings, hidden exports, denials.
 void undoLayer(Session& session);
 

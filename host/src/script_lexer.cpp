@@ -23,7 +23,6 @@ void escape(const std::string& line, size_t& pos, std::u16string& text) {
         case '"': text += u'"'; break;
         case 'n': text += u'\n'; break;
         case 'r': text += u'\r'; break;
-        case 't': text += u'\t'; break;
         case 'u': {
             std::string digits = line.substr(pos + 1, 4);
             size_t valid = 0;
@@ -259,8 +258,8 @@ std::string quote(const std::u16string& text) {
         } else if (c == u'\\' || c == u'"') {
             out += u'\\';
             out += c;
-        } else if (c == u'\n' || c == u'\r' || c == u'\t') {
-            out += c == u'\n' ? u"\\n" : c == u'\r' ? u"\\r" : u"\\t";
+        } else if (c == u'\n' || c == u'\r') {
+            out += c == u'\n' ? u"\\n" : u"\\r";
         } else if (c < 0x20 || c == 0x7F || (c >= 0xD800 && c <= 0xDFFF)) {
             out += u"\\u";
             for (int shift = 12; shift >= 0; shift -= 4)

@@ -144,12 +144,6 @@ std::string selectionText(int64_t selection) {
     return selection == LB_ERR ? "none" : std::to_string(selection);
 }
 
-// "" when the two agree, else "expected WHAT WANTED, GOT SEEN".
-std::string compare(bool same, const std::string& what, const std::string& wanted,
-                    const std::string& got, const std::string& seen) {
-    return same ? std::string() : "expected " + what + wanted + ", " + got + " " + seen;
-}
-
 // Why the record, the dialog or the name copy is not as expected, or "".
 std::string why(const ParamExpect& line, const ParamState& s) {
     using What = ParamExpect::What;
@@ -157,52 +151,48 @@ std::string why(const ParamExpect& line, const ParamState& s) {
     const ParamEditor& param = s.param;
     switch (line.what) {
         case What::Index:
-            return compare(param.rootIndex() == static_cast<uint32_t>(line.number),
-                           "the record's index ",
-                           std::to_string(static_cast<uint32_t>(line.number)), "got",
-                           std::to_string(param.rootIndex()));
+            return unless(param.rootIndex() == static_cast<uint32_t>(line.number),
+                          "the record's index " +
+                              std::to_string(static_cast<uint32_t>(line.number)),
+                          std::to_string(param.rootIndex()));
         case What::Bytes:
-            return compare(param.recordBytes() == line.bytes, "the record ", hexList(line.bytes),
-                           "got", hexList(param.recordBytes()));
+            return unless(param.recordBytes() == line.bytes, "the record " + hexList(line.bytes),
+                          hexList(param.recordBytes()));
         case What::Text:
         case What::Untouched:
             if (!s.copied)
                 return "param expect " + whatWord(line.what) +
                        " needs a param string line before it";
             if (line.what == What::Untouched)
-                return compare(s.text.untouched, "the buffer ", "untouched", "got",
-                               quote(s.text.text));
+                return unless(s.text.untouched, "the buffer untouched", quote(s.text.text));
             if (s.text.untouched)
                 return "expected " + quote(line.texts[0]) + ", the buffer was untouched";
-            return compare(s.text.text == line.texts[0], "", quote(line.texts[0]), "got",
-                           quote(s.text.text));
+            return unless(s.text.text == line.texts[0], quote(line.texts[0]), quote(s.text.text));
         default: break;
     }
     if (!s.edited)
         return "param expect " + whatWord(line.what) + " needs a param edit line before it";
     switch (line.what) {
         case What::Result:
-            return compare(s.result == line.number, "the dialog's result ",
-                           std::to_string(line.number), "got", std::to_string(s.result));
+            return unless(s.result == line.number,
+                          "the dialog's result " + std::to_string(line.number),
+                          std::to_string(s.result));
         case What::Selection:
-            return compare(seen.initialSelection == line.number, "the initial selection ",
-                           selectionText(line.number), "saw", selectionText(seen.initialSelection));
+            return unless(seen.initialSelection == line.number,
+                          "the initial selection " + selectionText(line.number),
+                          selectionText(seen.initialSelection));
         case What::Caption:
-            return compare(seen.caption == line.texts[0], "the caption ", quote(line.texts[0]),
-                           "saw", quote(seen.caption));
+            return unless(seen.caption == line.texts[0], "the caption " + quote(line.texts[0]),
+                          quote(seen.caption));
         case What::Items:
-            return compare(seen.items == line.texts, "the items ", texts(line.texts), "saw",
-                           texts(seen.items));
+            return unless(seen.items == line.texts, "the items " + texts(line.texts),
+                          texts(seen.items));
         case What::Open:
-            return compare(seen.openAfter == line.flags,
-                           "open after each step: ", yesNo(line.flags), "got",
-                           yesNo(seen.openAfter));
+            return unless(seen.openAfter == line.flags,
+                          "open after each step: " + yesNo(line.flags), yesNo(seen.openAfter));
         default:
-            return seen.ranOut == line.flags[0]
-                       ? std::string()
-                       : std::string("expected the steps ") +
-                             (line.flags[0] ? "to run out" : "not to run out") + ", they did" +
-                             (seen.ranOut ? "" : " not");
+            return unless(seen.ranOut == line.flags[0], "ranout " + yesNo(line.flags),
+                          yesNo({seen.ranOut}));
     }
 }
 
@@ -220,12 +210,9 @@ Command parseParam(Operands& in) {
     if (verb == "fill") return ParamRecord{true, static_cast<uint32_t>(integerOperand(in.peek()))};
     if (verb == "string") return ParamString{static_cast<Slot>(integerOperand(in.peek()))};
     Argument value = parseArgument(*in.peek());
-    Param::Kind kind = value.value.kind;
-    if (value.lastResult || (kind != Param::Kind::RootKey && kind != Param::Kind::Integer))
-        refuse("param record takes a root key name or an index");
-    return ParamRecord{false, kind == Param::Kind::RootKey
-                                  ? value.value.rootIndex
-                                  : static_cast<uint32_t>(value.value.integer)};
+    if (value.lastResult || value.value.kind != Param::Kind::RootKey)
+        refuse("param record takes a root key name or root:N");
+    return ParamRecord{false, value.value.rootIndex};
 }
 
 void run(Session& session, const Step& step, const ParamInit&) {

@@ -1,7 +1,5 @@
 // Registry lines: set-up and checks that go through the Win32 registry functions themselves, so
 // that one script runs alike against the portable layer and against a real registry.
-#include <cctype>
-
 #include "internal.h"
 #include "script_internal.h"
 
@@ -54,17 +52,12 @@ void appendText(std::vector<uint8_t>& data, const std::u16string& text) {
     data.push_back(0);
 }
 
-// The type word of `bytes`: a name of TypeNames or a 32-bit number.
+// The type word of `bytes`: a name of TypeNames.
 uint32_t parseTypeWord(const std::string& word) {
     for (const TypeName& t : TypeNames)
         if (word == t.word) return t.type;
-    int64_t number = 0;
-    if (word.empty() || !std::isdigit(static_cast<unsigned char>(word[0])) ||
-        !parseInteger(word, number).empty())
-        refuse("unknown value type '" + word +
-               "' (none, sz, expand_sz, binary, dword, dword_be, link, multi_sz, qword or a "
-               "number)");
-    return static_cast<uint32_t>(number);
+    refuse("unknown value type '" + word +
+           "' (none, sz, expand_sz, binary, dword, dword_be, link, multi_sz or qword)");
 }
 
 // The data of a value: a type word and what that type takes. sz and expand_sz take one text,

@@ -19,7 +19,7 @@ Session::Session(Module& module, const std::string& file, std::ostream& output, 
 void Session::freshInstance() {
     instance_.reset();
     last_.reset();
-    eventCalls.clear();
+    eventCalls = {0, 0};
     instance_ = std::make_unique<Instance>(module_);
 }
 

@@ -44,10 +44,9 @@ void run(Session& session, const Step& step, const FileBytes& line) {
         std::vector<uint8_t> bytes((std::istreambuf_iterator<char>(in)),
                                    std::istreambuf_iterator<char>());
         if (!in) refuse("cannot read " + line.path);
-        return session.checked(step, bytes == line.bytes ? ""
-                                                         : "expected " + line.path + " to hold " +
-                                                               hexList(line.bytes) + ", it holds " +
-                                                               hexList(bytes));
+        return session.checked(
+            step, unless(bytes == line.bytes, line.path + " to hold " + hexList(line.bytes),
+                         hexList(bytes)));
     }
     std::ofstream out(line.path, std::ios::binary | std::ios::trunc);
     out.write(reinterpret_cast<const char*>(line.bytes.data()),

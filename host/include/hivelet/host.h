@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace hv {
@@ -39,11 +40,13 @@ struct Param {
     uint32_t rootIndex = 0;  // RootKey: the u32 at byte 6 of a RootKeyParam record
     Slot address = 0;        // Address: passed as is (a text the module returned earlier)
 
-    static Param null();
-    static Param str(std::u16string text);
-    static Param integerValue(int32_t value);
-    static Param rootKey(uint32_t index);
-    static Param rawAddress(const void* address);
+    static Param null() { return Param{}; }
+    static Param str(std::u16string text) { return {Kind::Text, std::move(text)}; }
+    static Param integerValue(int32_t value) { return {Kind::Integer, {}, value}; }
+    static Param rootKey(uint32_t index) { return {Kind::RootKey, {}, 0, index}; }
+    static Param rawAddress(const void* address) {
+        return {Kind::Address, {}, 0, 0, reinterpret_cast<Slot>(address)};
+    }
 };
 
 // What an event gave back, and what the host saw while it ran.
@@ -149,9 +152,15 @@ public:
     // can be handed back (Param::rawAddress). Throws std::out_of_range when the module's table
     // has no routine with this code.
     Outcome run(EventKind kind, int code, const std::vector<Param>& params);
-    Outcome condition(int code, const std::vector<Param>& params = {});
-    Outcome action(int code, const std::vector<Param>& params = {});
-    Outcome expression(int code, const std::vector<Param>& params = {});
+    Outcome condition(int code, const std::vector<Param>& params = {}) {
+        return run(EventKind::Condition, code, params);
+    }
+    Outcome action(int code, const std::vector<Param>& params = {}) {
+        return run(EventKind::Action, code, params);
+    }
+    Outcome expression(int code, const std::vector<Param>& params = {}) {
+        return run(EventKind::Expression, code, params);
+    }
 
     // The record as the module sees it.
     uint8_t* record() { return record_; }
@@ -214,7 +223,6 @@ private:
     void readResult(EventKind kind, Outcome& outcome);
     size_t locateText(const uint8_t* text, Outcome& outcome) const;
     void checkSentinels(Outcome& outcome);
-    std::string damageToRecord() const;
     std::string damageToHeader() const;
 };
 

@@ -49,7 +49,7 @@ struct Poke {
     uint32_t value = 0;
 };
 
-// expect [result] VALUE: the last event's result, as written (integers within 32 bits).
+// expect VALUE: the last event's result, as written (integers within 32 bits).
 struct ExpectResult {
     std::variant<int64_t, bool, std::u16string> value;
 };
@@ -118,13 +118,8 @@ struct Deny : LayerControl {
 struct Fail : LayerControl {
     static constexpr const char* needs = "fault injection";
     std::string function;
-    unsigned nth = 0;  // 1 for the next call; 0 for every call
+    unsigned nth = 1;  // 1 for the next call
     long code = 0;
-};
-
-// layer clear.
-struct Clear : LayerControl {
-    static constexpr const char* needs = "fault injection";
 };
 
 // layer hide|unhide NAME.
@@ -172,7 +167,7 @@ struct FileBytes {
 // debug: both debugger lines.
 struct Debug {};
 
-// param fill BYTE / param record ROOT|N.
+// param fill BYTE / param record ROOT.
 struct ParamRecord {
     bool fill = false;
     uint32_t value = 0;
@@ -212,8 +207,8 @@ struct ParamExpect {
 using Command =
     std::variant<Event, Show, Echo, New, Buffers, Poke, ExpectResult, ExpectNumber, ExpectBuffers,
                  ExpectAddress, ExpectCurrentKey, ExpectSentence, ExpectDebug, Registry, Deny, Fail,
-                 Clear, Hide, Version, Handles, Calls, StateFile, FileBytes, Debug, ParamRecord,
-                 ParamInit, ParamEdit, ParamString, ParamExpect>;
+                 Hide, Version, Handles, Calls, StateFile, FileBytes, Debug, ParamRecord, ParamInit,
+                 ParamEdit, ParamString, ParamExpect>;
 
 // One line of a script, parsed.
 struct Step {
