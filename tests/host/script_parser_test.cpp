@@ -311,9 +311,9 @@ TEST(ScriptParser, ParamLines) {
     EXPECT_EQ(as<ParamRecord>(s[2]).value, 0xFFFFFFFFu);
     EXPECT_TRUE(as<ParamRecord>(s[3]).fill);
     EXPECT_EQ(as<ParamString>(s[4]).capacity, 64);
-    EXPECT_EQ(as<ParamExpect>(s[5]).number, LB_ERR);
-    EXPECT_EQ(as<ParamExpect>(s[6]).flags, (std::vector<bool>{true, false}));
-    EXPECT_EQ(as<ParamExpect>(s[7]).bytes, bytes({0x10, 0, 0xAB}));
+    EXPECT_EQ(as<ParamExpect>(s[5]).wanted, "none");
+    EXPECT_EQ(as<ParamExpect>(s[6]).wanted, "yes no");
+    EXPECT_EQ(as<ParamExpect>(s[7]).wanted, "[10 00 ab]");
 }
 
 // A block left open is reported at its own line; a closing brace needs an open block.

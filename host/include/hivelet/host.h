@@ -181,9 +181,6 @@ public:
     // (`error` then says why).
     int saveState(const std::string& path, std::string* error = nullptr);
     int loadState(const std::string& path, std::string* error = nullptr);
-    // The same through a temporary file: the bytes the module wrote, or the bytes to load.
-    int saveState(std::vector<uint8_t>& bytes);
-    int loadState(const std::vector<uint8_t>& bytes);
 
     // One debugger line, as GetDebugItem leaves the host's 256-character line buffer: the
     // buffer starts filled with 0xBEBE characters and has sentinels after it.

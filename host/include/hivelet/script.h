@@ -198,10 +198,7 @@ struct ParamExpect {
         Untouched
     };
     What what = What::Index;
-    int64_t number = 0;                 // index, result, selection (LB_ERR: none)
-    std::vector<uint8_t> bytes;         // bytes
-    std::vector<std::u16string> texts;  // items, caption, text
-    std::vector<bool> flags;            // open, ranout
+    std::string wanted;  // as the transcript shows it: "4", "none", "[10 00 ab]", "yes no" ...
 };
 
 using Command =
