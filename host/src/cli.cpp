@@ -187,18 +187,33 @@ const char Usage[] =
     "script and runs the script's conditions, actions and expressions, printing each event\n"
     "with its result and lastError, and checking the script's expectations.\n"
     "\n"
-    "  run     run the scripts; the exit status is 0 when all passed, 1 when one failed\n"
-    "  menus   print the editor's view of the events: the three menus as trees, each event\n"
-    "          with its code, display text and parameter titles\n"
-    "  catalogue  print the same catalogue as JSON, with the object's identity strings and the\n"
-    "             messages of the module's own error codes, for tools\n"
-    "  dump-state  print a saved-state file (version, root key, last error, key); a\n"
-    "              malformed file gives a message and exit status 1\n"
-    "  --module PATH   the module to load; by default $HIVELET_MODULE, or else Hivelet.hzx\n"
-    "                  beside this program\n"
+    "  run         run the scripts; exit status 0 when all passed, 1 when one failed\n"
+    "  menus       print the editor's view of the events: menus, codes, texts, titles\n"
+    "  catalogue   print the same as JSON for tools, with identity strings and messages\n"
+    "  dump-state  print a saved-state file; a malformed one gives exit status 1\n"
+    "  --module PATH  the module; default $HIVELET_MODULE, else Hivelet.hzx beside the program\n"
     "\n"
     "Exit status 2: a usage error or a module that cannot be loaded.\n"
     "The script language is described in docs/scripts.md.\n";
+
+// Reads, parses and runs a script file; true when every line passed.
+bool runFile(Module& module, const std::string& path, std::ostream& out, std::ostream& err) {
+    std::ifstream file(path, std::ios::binary);
+    std::string text((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
+    if (!file || file.bad()) {
+        out.flush();
+        err << path << ": cannot read the script" << std::endl;
+        return false;
+    }
+    ParseResult parsed = parse(path, text);
+    if (!parsed.ok()) {
+        out << "== " << path << ": not run\n\n";
+        out.flush();
+        err << parsed.error << std::endl;
+        return false;
+    }
+    return runScript(module, parsed.script, out, err);
+}
 
 // Reports a usage error with the usage text; the exit status for it.
 int usageError(std::ostream& err, const std::string& message) {
@@ -246,9 +261,9 @@ int moduleCommand(const std::vector<std::string>& args, std::ostream& out, std::
         return 2;
     }
     if (run) {
-        Runner runner(*module, out, err);
         unsigned failed = 0;
-        for (const std::string& script : parsed.operands) failed += runner.runFile(script) ? 0 : 1;
+        for (const std::string& script : parsed.operands)
+            failed += runFile(*module, script, out, err) ? 0 : 1;
         out << parsed.operands.size() << " script(s), " << failed << " failed" << std::endl;
         return failed ? 1 : 0;
     }

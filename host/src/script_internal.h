@@ -117,13 +117,10 @@ struct ParamState;
 // The state of one running script: its instance and the last event's outcome.
 class Session {
 public:
-    Session(Module& module, const std::string& file, std::ostream& out, std::ostream& err,
-            bool layer);
+    Session(Module& module, std::ostream& out, bool layer);
     Instance& instance() { return *instance_; }
     Module& module() { return module_; }
     void freshInstance();
-    // Reports a failure of `step` as "file:line: message".
-    void fail(const Step& step, const std::string& message);
     // Prints a transcript line for `step`.
     void show(const Step& step, const std::string& detail);
     // Shows a line that this build cannot run, with the reason.
@@ -149,8 +146,6 @@ public:
 
 private:
     Module& module_;
-    std::string file_;
-    std::ostream& err_;
     std::unique_ptr<Instance> instance_;
     std::optional<Outcome> last_;
     EventKind lastKind_ = EventKind::Condition;

@@ -28,8 +28,7 @@ Ran run(const std::string& text, hv::Module& module = hivelet()) {
     hv::script::ParseResult parsed = hv::script::parse("t.hvs", text);
     EXPECT_TRUE(parsed.ok()) << parsed.error;
     std::ostringstream out, err;
-    hv::script::Runner runner(module, out, err);
-    bool passed = runner.run(parsed.script);
+    bool passed = hv::script::runScript(module, parsed.script, out, err);
     return {passed, out.str(), err.str()};
 }
 
@@ -38,9 +37,7 @@ Ran runWithoutLayer(const std::string& text) {
     hv::script::ParseResult parsed = hv::script::parse("t.hvs", text);
     EXPECT_TRUE(parsed.ok()) << parsed.error;
     std::ostringstream out, err;
-    hv::script::Runner runner(hivelet(), out, err);
-    runner.setLayer(false);
-    bool passed = runner.run(parsed.script);
+    bool passed = hv::script::runScript(hivelet(), parsed.script, out, err, false);
     return {passed, out.str(), err.str()};
 }
 

@@ -101,7 +101,6 @@ public:
     struct Tables {
         std::vector<Slot> conditions, actions, expressions;  // each without its null end
         bool conditionsEnd, actionsEnd, expressionsEnd;      // a null entry follows the last one
-        uint16_t conditionCount, actionCount, expressionCount;
         // The whole block as the module left it (filled with fill::infos before), followed by
         // fill::guardSize bytes that the module must not write.
         std::vector<uint8_t> block;

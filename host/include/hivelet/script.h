@@ -238,25 +238,12 @@ ParseResult parse(const std::string& file, const std::string& text);
 // A text as a script would write it: quoted, with escapes for quotes, backslashes and controls.
 std::string quote(const std::u16string& text);
 
-// Runs scripts against one loaded module and writes a transcript. Each script gets a fresh
-// instance; a failure stops its script.
-class Runner {
-public:
-    Runner(Module& module, std::ostream& out, std::ostream& err);
-    // Runs a parsed script; true when every line passed.
-    bool run(const Script& script);
-    // Reads, parses and runs a script file; true when every line passed.
-    bool runFile(const std::string& path);
-    // Whether the portable layer's test control is there to run layer lines: on Linux builds
-    // by default. Without it every layer line is skipped with a note, as on Windows builds.
-    void setLayer(bool present);
-
-private:
-    Module& module_;
-    std::ostream& out_;
-    std::ostream& err_;
-    bool layer_;
-};
+// Runs a parsed script on a fresh instance of the module, writing its transcript to `out` and
+// its first failure, which stops it, to `err`; true when every line passed. Layer lines run
+// where the portable layer's test control is there (Linux builds) unless `layer` is false;
+// without it each is skipped with a note, as on Windows builds.
+bool runScript(Module& module, const Script& script, std::ostream& out, std::ostream& err,
+               bool layer = true);
 
 // The hivelet-host command line (without the program name); returns the exit status:
 // 0 when every script passed, 1 when one failed, 2 for a usage error or a module that cannot
