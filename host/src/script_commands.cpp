@@ -50,20 +50,11 @@ Command parseShow(Operands& in) {
     refuse("show takes cnd, act or exp, a routine name and its parameters");
 }
 
-// For commands without operands.
-void nothingAfter(const Operands& in, const std::string& command) {
-    if (in.left() && in.peek()->quoted) refuse(command + " takes nothing after it");
+// A command without operands.
+template <typename Line>
+Command parseBare(Operands& in) {
     in.end();
-}
-
-Command parseNew(Operands& in) {
-    nothingAfter(in, "new");
-    return New{};
-}
-
-Command parseDebug(Operands& in) {
-    nothingAfter(in, "debug");
-    return Debug{};
+    return Line{};
 }
 
 // buffers on | off.
@@ -92,7 +83,7 @@ const std::pair<const char*, Parser> Commands[] = {
     {"act", parseEventLine<EventKind::Action>},
     {"exp", parseEventLine<EventKind::Expression>},
     {"expect", parseExpect},
-    {"new", parseNew},
+    {"new", parseBare<New>},
     {"buffers", parseBuffers},
     {"poke", parsePoke},
     {"reg", parseRegistry},
@@ -101,7 +92,7 @@ const std::pair<const char*, Parser> Commands[] = {
     {"save", [](Operands& in) -> Command { return parseStateFile(in, true); }},
     {"load", [](Operands& in) -> Command { return parseStateFile(in, false); }},
     {"file", [](Operands& in) -> Command { return parseFileBytes(in, false); }},
-    {"debug", parseDebug},
+    {"debug", parseBare<Debug>},
     {"param", parseParam},
 };
 

@@ -59,19 +59,13 @@ Command parseAddress(Operands& in) {
     refuse("expect address takes currentKey, buffer or elsewhere");
 }
 
-// expect currentKey "text" | null
-Command parseCurrentKey(Operands& in) {
+// expect currentKey "text" | null, expect sentence "text"
+Command parseText(Operands& in, bool sentence) {
     const Token* t = in.left() == 1 ? in.next() : nullptr;
-    if (!t || (!t->quoted && t->word != "null")) refuse("expect currentKey takes a text or null");
-    ExpectCurrentKey line;
-    if (t->quoted) line.key = t->text;
-    return line;
-}
-
-// expect sentence "text"
-Command parseSentence(Operands& in) {
-    if (in.left() != 1) refuse("expect sentence needs a text");
-    return ExpectSentence{in.text("expect sentence needs a text")};
+    if (!t || (!t->quoted && (sentence || t->word != "null")))
+        refuse(sentence ? "expect sentence needs a text"
+                        : "expect currentKey takes a text or null");
+    return ExpectText{sentence, t->quoted ? quote(t->text) : "null"};
 }
 
 // expect debug ITEM "text" | untouched
@@ -89,8 +83,8 @@ Command parseDebug(Operands& in) {
 const std::pair<const char*, Parser> Subjects[] = {
     {"buffers", parseBuffers},
     {"address", parseAddress},
-    {"currentKey", parseCurrentKey},
-    {"sentence", parseSentence},
+    {"currentKey", [](Operands& in) { return parseText(in, false); }},
+    {"sentence", [](Operands& in) { return parseText(in, true); }},
     {"debug", parseDebug},
     {"file", [](Operands& in) -> Command { return parseFileBytes(in, true); }},
 };
@@ -234,17 +228,13 @@ void run(Session& s, const Step& step, const ExpectAddress& line) {
     s.checked(step, why);
 }
 
-void run(Session& s, const Step& step, const ExpectCurrentKey& line) {
+void run(Session& s, const Step& step, const ExpectText& line) {
     const char16_t* key = s.instance().currentKey();
-    bool same = line.key ? key && *line.key == key : key == nullptr;
-    s.checked(step, unless(same, "currentKey " + (line.key ? quote(*line.key) : "null"),
-                           key ? quote(key) : "null"));
-}
-
-void run(Session& s, const Step& step, const ExpectSentence& line) {
-    if (!s.sentence) refuse("expect sentence with no show line before it");
-    s.checked(step, unless(*s.sentence == line.text, "the sentence " + quote(line.text),
-                           quote(*s.sentence)));
+    if (line.sentence && !s.sentence) refuse("expect sentence with no show line before it");
+    std::string actual = line.sentence ? quote(*s.sentence) : key ? quote(key) : "null";
+    s.checked(step,
+              unless(actual == line.wanted,
+                     (line.sentence ? "the sentence " : "currentKey ") + line.wanted, actual));
 }
 
 void run(Session& s, const Step& step, const ExpectDebug& line) {

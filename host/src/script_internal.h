@@ -53,8 +53,6 @@ public:
     const Token* next() { return at_ < tokens_.size() ? &tokens_[at_++] : nullptr; }
     // The next operand when it is a bare word, else "" (nothing is taken).
     std::string word();
-    // The next operand when it is a quoted text.
-    bool text(std::u16string& out);
     // The next operand, which must be a quoted text; else refuses with `usage`.
     std::u16string text(const std::string& usage);
     // The next operand, which must be a bare 32-bit integer; else refuses with `usage`.
@@ -163,8 +161,7 @@ void run(Session& s, const Step& step, const ExpectResult& line);
 void run(Session& s, const Step& step, const ExpectNumber& line);
 void run(Session& s, const Step& step, const ExpectBuffers& line);
 void run(Session& s, const Step& step, const ExpectAddress& line);
-void run(Session& s, const Step& step, const ExpectCurrentKey& line);
-void run(Session& s, const Step& step, const ExpectSentence& line);
+void run(Session& s, const Step& step, const ExpectText& line);
 void run(Session& s, const Step& step, const ExpectDebug& line);
 void run(Session& s, const Step& step, const Registry& line);
 void run(Session& s, const Step& step, const Deny& line);

@@ -110,18 +110,11 @@ std::string Operands::word() {
     return t->word;
 }
 
-bool Operands::text(std::u16string& out) {
-    const Token* t = peek();
-    if (!t || !t->quoted) return false;
-    out = t->text;
-    ++at_;
-    return true;
-}
-
 std::u16string Operands::text(const std::string& usage) {
-    std::u16string out;
-    if (!text(out)) refuse(usage);
-    return out;
+    const Token* t = peek();
+    if (!t || !t->quoted) refuse(usage);
+    ++at_;
+    return t->text;
 }
 
 int64_t Operands::integer(const std::string& usage) {

@@ -66,10 +66,9 @@ uint32_t parseTypeWord(const std::string& word) {
 // writes.
 void parseData(Operands& in, Registry& reg) {
     std::string kind = in.word();
-    std::u16string text;
     if (kind == "multi_sz") {
         reg.type = REG_MULTI_SZ;
-        while (in.text(text)) appendText(reg.data, text);
+        while (in.left() && in.peek()->quoted) appendText(reg.data, in.next()->text);
         appendText(reg.data, u"");  // the empty text that ends the list
     } else if (kind == "sz" || kind == "expand_sz") {
         reg.type = kind == "sz" ? REG_SZ : REG_EXPAND_SZ;

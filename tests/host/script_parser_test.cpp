@@ -110,8 +110,8 @@ TEST(ScriptParser, ExpectationForms) {
     EXPECT_TRUE(as<ExpectBuffers>(s[7]).sizes.empty());
     EXPECT_EQ(as<ExpectBuffers>(s[8]).sizes, (std::vector<size_t>{1024, 8}));
     EXPECT_EQ(as<ExpectAddress>(s[9]).place, hv::Outcome::TextSource::CurrentKey);
-    EXPECT_FALSE(as<ExpectCurrentKey>(s[11]).key);
-    EXPECT_EQ(as<ExpectCurrentKey>(s[12]).key, u"k");
+    EXPECT_EQ(as<ExpectText>(s[11]).wanted, "null");
+    EXPECT_EQ(as<ExpectText>(s[12]).wanted, "\"k\"");
     EXPECT_FALSE(as<ExpectDebug>(s[14]).text);
     EXPECT_TRUE(as<FileBytes>(s[15]).check);
 }

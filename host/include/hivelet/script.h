@@ -71,14 +71,11 @@ struct ExpectAddress {
     Outcome::TextSource place = Outcome::TextSource::Elsewhere;
 };
 
-// expect currentKey "text"|null.
-struct ExpectCurrentKey {
-    std::optional<std::u16string> key;
-};
-
-// expect sentence "text": what the last show line printed.
-struct ExpectSentence {
-    std::u16string text;
+// expect currentKey "text"|null, expect sentence "text": the record's current key, or what the
+// last show line printed.
+struct ExpectText {
+    bool sentence = false;
+    std::string wanted;  // quoted as scripts write texts, or null
 };
 
 // expect debug ITEM "text"|untouched.
@@ -201,11 +198,10 @@ struct ParamExpect {
     std::string wanted;  // as the transcript shows it: "4", "none", "[10 00 ab]", "yes no" ...
 };
 
-using Command =
-    std::variant<Event, Show, Echo, New, Buffers, Poke, ExpectResult, ExpectNumber, ExpectBuffers,
-                 ExpectAddress, ExpectCurrentKey, ExpectSentence, ExpectDebug, Registry, Deny, Fail,
-                 Hide, Version, Handles, Calls, StateFile, FileBytes, Debug, ParamRecord, ParamInit,
-                 ParamEdit, ParamString, ParamExpect>;
+using Command = std::variant<Event, Show, Echo, New, Buffers, Poke, ExpectResult, ExpectNumber,
+                             ExpectBuffers, ExpectAddress, ExpectText, ExpectDebug, Registry, Deny,
+                             Fail, Hide, Version, Handles, Calls, StateFile, FileBytes, Debug,
+                             ParamRecord, ParamInit, ParamEdit, ParamString, ParamExpect>;
 
 // One line of a script, parsed.
 struct Step {
