@@ -25,9 +25,10 @@ struct EditorServices {
     }
 };
 
-Editor::Editor() : bytes_(alignUp(hostLayout.editorSize, 16) + fill::guardSize, fill::editor) {
+Editor::Editor()
+    : bytes_(alignUp(BuildLayout.editorSize, 16) + Fill::GuardSize, Fill::EditorStructure) {
     setHostVersion(version_, true);
-    writeAt(bytes_.data(), hostLayout.insertProperties, &EditorServices::insertProperties);
+    writeAt(bytes_.data(), BuildLayout.insertProperties, &EditorServices::insertProperties);
     setWindow(nullptr);
     activeEditor = this;
 }
@@ -39,7 +40,7 @@ Editor::~Editor() {
 void Editor::setHostVersion(uint32_t version, bool present) {
     version_ = version;
     auto service = present ? &EditorServices::getHostVersion : nullptr;
-    writeAt(bytes_.data(), hostLayout.getHostVersion, service);
+    writeAt(bytes_.data(), BuildLayout.getHostVersion, service);
 }
 
 void* Editor::structure() {
@@ -48,7 +49,7 @@ void* Editor::structure() {
 }
 
 void Editor::setWindow(HWND window) {
-    writeAt(bytes_.data(), hostLayout.editorWindow, window);
+    writeAt(bytes_.data(), BuildLayout.editorWindow, window);
 }
 
 }  // namespace hv

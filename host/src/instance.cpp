@@ -107,7 +107,7 @@ struct Services {
         if (self->lendNoBuffer_) return nullptr;
         std::string name = "lent buffer " + std::to_string(e.buffers.size() + 1) + " (" +
                            std::to_string(bytes) + " bytes)";
-        e.buffers.emplace_back(name, static_cast<size_t>(bytes), fill::buffer);
+        e.buffers.emplace_back(name, static_cast<size_t>(bytes), Fill::Buffer);
         return reinterpret_cast<LPWSTR>(e.buffers.back().data());
     }
 
@@ -158,13 +158,13 @@ Instance::Instance(Module& module) : module_(module) {
     // An instance that could not be destroyed is refused before it is created.
     module.entry<DestroyEntry>("DestroyRunObject");
     recordSize_ = static_cast<uint16_t>(dataSize(0, 0));
-    if (recordSize_ < hostLayout.headerSize)
+    if (recordSize_ < BuildLayout.headerSize)
         throw std::runtime_error("GetRunObjectDataSize gave " + std::to_string(recordSize_) +
                                  " bytes, less than the host's own header");
     // The accessors read the module's fields at their offsets even if the module asked for
     // too little: those bytes then lie in the guard, inside the allocation.
-    size_t guard = fill::guardSize + std::max(recordSize_, hostLayout.recordSize) - recordSize_;
-    block_ = std::make_unique<Guarded>("record", recordSize_, fill::record, guard);
+    size_t guard = Fill::GuardSize + std::max(recordSize_, BuildLayout.recordSize) - recordSize_;
+    block_ = std::make_unique<Guarded>("record", recordSize_, Fill::Record, guard);
     record_ = block_->data();
     layOutHeader();
     liveRecords()[record_] = this;
@@ -179,8 +179,8 @@ Instance::~Instance() {
 
 // Bytes 0 to 7 of the header hold the owning instance; byte 8 the run header.
 void Instance::layOutHeader() {
-    const HostLayout& l = hostLayout;
-    runHeader_.assign(l.runHeaderSize, fill::runHeader);
+    const HostLayout& l = BuildLayout;
+    runHeader_.assign(l.runHeaderSize, Fill::RunHeader);
     writeAt(runHeader_.data(), l.getStringBuffer, &Services::getStringBuffer);
     writeAt(runHeader_.data(), l.getFirstExpressionParameter, &Services::firstExpressionParameter);
     writeAt(runHeader_.data(), l.getNextExpressionParameter, &Services::nextExpressionParameter);
@@ -214,7 +214,7 @@ void Instance::beginEvent(EventKind kind, const std::vector<Param>& params, Outc
     for (const Param& p : params) e.values.push_back(prepareParameter(p));
     // A flag left from an earlier event must not pass for this one's.
     setHeaderFlags(headerFlags() & ~StringResultFlag);
-    e.headerBefore.assign(record_, record_ + hostLayout.headerSize);
+    e.headerBefore.assign(record_, record_ + BuildLayout.headerSize);
 }
 
 // From now on the event's blocks are the host's: any later write into them is damage.
@@ -338,7 +338,7 @@ void Instance::checkSentinels(Outcome& outcome) {
 // only set StringResultFlag.
 std::string Instance::damageToHeader() const {
     const std::vector<uint8_t>& was = event_->headerBefore;
-    size_t flags = hostLayout.headerFlags, rest = flags + sizeof(uint16_t);
+    size_t flags = BuildLayout.headerFlags, rest = flags + sizeof(uint16_t);
     long changed = firstDifference(record_, was.data(), flags);
     if (changed < 0) {
         changed = firstDifference(record_ + rest, was.data() + rest, was.size() - rest);

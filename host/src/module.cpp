@@ -97,9 +97,9 @@ FARPROC Module::require(const char* name) const {
 // Hands the module a block filled with a pattern, with guard bytes after it, so that bytes it
 // must leave alone can be told from the ones it wrote.
 bool Module::readTables(std::string* error) {
-    const HostLayout& l = hostLayout;
+    const HostLayout& l = BuildLayout;
     size_t blockSize = alignUp(l.infoSize, l.pointerSize);
-    tables_.block.assign(blockSize + fill::guardSize, fill::infos);
+    tables_.block.assign(blockSize + Fill::GuardSize, Fill::Infos);
     try {
         auto infos = entry<GetRunObjectInfosEntry>("GetRunObjectInfos");
         tables_.infosResult = infos(0, tables_.block.data());
@@ -107,7 +107,7 @@ bool Module::readTables(std::string* error) {
         *error = e.what();
         return false;
     }
-    if (firstNotPattern(tables_.block.data() + blockSize, fill::infos, fill::guardSize) >= 0) {
+    if (firstNotPattern(tables_.block.data() + blockSize, Fill::Infos, Fill::GuardSize) >= 0) {
         *error = "GetRunObjectInfos wrote past the end of the RunObjectInfos block";
         return false;
     }

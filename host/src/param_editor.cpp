@@ -15,26 +15,26 @@ typedef void(WINAPI* GetParameterStringFn)(void* editor, Slot unused, const void
 // The dialog's list of root keys.
 const int RootKeyList = 1001;
 
-const char16_t BufferFill = static_cast<char16_t>(fill::buffer << 8 | fill::buffer);
+const char16_t BufferFill = static_cast<char16_t>(Fill::Buffer << 8 | Fill::Buffer);
 
 }  // namespace
 
 ParamEditor::ParamEditor(Module& module, Editor& editor)
     : module_(module), editor_(editor),
-      bytes_(hostLayout.rootParamSize + fill::guardSize, fill::guard) {
+      bytes_(BuildLayout.rootParamSize + Fill::GuardSize, Fill::Guard) {
     setRecord(0);
 }
 
 std::vector<uint8_t> ParamEditor::recordBytes() const {
-    return std::vector<uint8_t>(bytes_.begin(), bytes_.begin() + hostLayout.rootParamSize);
+    return std::vector<uint8_t>(bytes_.begin(), bytes_.begin() + BuildLayout.rootParamSize);
 }
 
 uint32_t ParamEditor::rootIndex() const {
-    return readAt<uint32_t>(bytes_.data(), hostLayout.rootParamIndex);
+    return readAt<uint32_t>(bytes_.data(), BuildLayout.rootParamIndex);
 }
 
 void ParamEditor::fillRecord(uint8_t byte) {
-    std::fill(bytes_.begin(), bytes_.begin() + hostLayout.rootParamSize, byte);
+    std::fill(bytes_.begin(), bytes_.begin() + BuildLayout.rootParamSize, byte);
 }
 
 void ParamEditor::setRecord(uint32_t index) {
@@ -43,8 +43,8 @@ void ParamEditor::setRecord(uint32_t index) {
 }
 
 bool ParamEditor::recordIntact() const {
-    return firstNotPattern(bytes_.data() + hostLayout.rootParamSize, fill::guard,
-                           fill::guardSize) < 0;
+    return firstNotPattern(bytes_.data() + BuildLayout.rootParamSize, Fill::Guard,
+                           Fill::GuardSize) < 0;
 }
 
 void ParamEditor::init() {
@@ -61,7 +61,7 @@ Slot ParamEditor::edit(const std::vector<UserStep>& steps, DialogSeen* seen) {
 ParamEditor::Text ParamEditor::string(Slot capacity) {
     auto count = static_cast<int16_t>(static_cast<uint16_t>(capacity));
     size_t room = count > 0 ? static_cast<size_t>(count) : 0;
-    std::vector<char16_t> buffer(room + fill::guardSize, BufferFill);
+    std::vector<char16_t> buffer(room + Fill::GuardSize, BufferFill);
     module_.entry<GetParameterStringFn>("GetParameterString")(
         editor_.structure(), 0, record(), reinterpret_cast<LPWSTR>(buffer.data()), capacity);
     Text out;

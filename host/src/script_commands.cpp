@@ -66,8 +66,8 @@ Command parseBuffers(Operands& in) {
 
 // poke FIELD INTEGER: the record fields a script may overwrite, as a loaded saved state could.
 Command parsePoke(Operands& in) {
-    const std::pair<const char*, size_t> fields[] = {{"rootKeyIndex", hostLayout.rootKeyIndex},
-                                                     {"lastError", hostLayout.lastError}};
+    const std::pair<const char*, size_t> fields[] = {{"rootKeyIndex", BuildLayout.rootKeyIndex},
+                                                     {"lastError", BuildLayout.lastError}};
     std::string field = in.word();
     Poke poke;
     for (auto [name, offset] : fields)

@@ -167,8 +167,8 @@ std::string listed(const std::vector<size_t>& sizes) {
 
 // Where a text result lies, as messages say it.
 const char* placePhrase(Outcome::TextSource place) {
-    static const char* const phrases[] = {"", "in a lent buffer", "in currentKey", "elsewhere"};
-    return phrases[static_cast<size_t>(place)];
+    static const char* const Phrases[] = {"", "in a lent buffer", "in currentKey", "elsewhere"};
+    return Phrases[static_cast<size_t>(place)];
 }
 
 // The debugger line as the transcript shows it: quoted, and whether the buffer was touched.

@@ -219,12 +219,12 @@ std::vector<uint8_t> parseHex(const std::u16string& text) {
 }
 
 std::string hexList(const std::vector<uint8_t>& bytes) {
-    static const char digits[] = "0123456789abcdef";
+    static const char Digits[] = "0123456789abcdef";
     std::string out;
     for (uint8_t b : bytes) {
         if (!out.empty()) out += ' ';
-        out += digits[b >> 4];
-        out += digits[b & 15];
+        out += Digits[b >> 4];
+        out += Digits[b & 15];
     }
     return "[" + out + "]";
 }
@@ -234,13 +234,13 @@ const char* rootKeyName(uint32_t index) {
 }
 
 HKEY rootKeyHandle(uint32_t index) {
-    static const HKEY roots[] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,
+    static const HKEY Roots[] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,
                                  HKEY_CURRENT_CONFIG, HKEY_USERS};
-    return roots[index];
+    return Roots[index];
 }
 
 std::string quote(const std::u16string& text) {
-    static const char digits[] = "0123456789abcdef";
+    static const char Digits[] = "0123456789abcdef";
     std::u16string out = u"\"";
     for (size_t i = 0; i < text.size(); ++i) {
         char16_t c = text[i];
@@ -256,7 +256,7 @@ std::string quote(const std::u16string& text) {
         } else if (c < 0x20 || c == 0x7F || (c >= 0xD800 && c <= 0xDFFF)) {
             out += u"\\u";
             for (int shift = 12; shift >= 0; shift -= 4)
-                out += static_cast<char16_t>(digits[(c >> shift) & 15]);
+                out += static_cast<char16_t>(Digits[(c >> shift) & 15]);
         } else {
             out += c;
         }

@@ -167,15 +167,19 @@ void createKey(Session& session, const Step& step, const Registry& reg) {
     session.show(step, disposition == REG_CREATED_NEW_KEY ? "created" : "was there");
 }
 
+// Whether the key is there: 0, 2 for a missing key, or another failure. It is opened asking for
+// no rights, so a key whose rights are denied still counts.
+LONG probe(const RegistryKey& key) {
+    HKEY handle = nullptr;
+    LONG result = openKey(key, 0, &handle);
+    if (result == ERROR_SUCCESS) RegCloseKey(handle);
+    return result;
+}
+
 void deleteKey(Session& session, const Step& step, const Registry& reg) {
-    HKEY key = nullptr;
-    LONG result = openKey(reg.key, 0, &key);
-    if (result == ERROR_FILE_NOT_FOUND) {
-        return session.show(step, "was not there");
-    }
-    if (result == ERROR_SUCCESS) RegCloseKey(key);
+    if (probe(reg.key) == ERROR_FILE_NOT_FOUND) return session.show(step, "was not there");
     const char* failed = "";
-    result = deleteTree(rootKeyHandle(reg.key.root), reg.key.path, reg.key.view, &failed);
+    LONG result = deleteTree(rootKeyHandle(reg.key.root), reg.key.path, reg.key.view, &failed);
     if (result != ERROR_SUCCESS) callFailed(reg, failed, result);
     session.show(step, "deleted");
 }
@@ -213,9 +217,7 @@ void deleteValue(Session& session, const Step& step, const Registry& reg) {
 
 // Why the key is not as expected, or "".
 std::string keyWhy(const Registry& reg) {
-    HKEY key = nullptr;
-    LONG result = openKey(reg.key, 0, &key);
-    if (result == ERROR_SUCCESS) RegCloseKey(key);
+    LONG result = probe(reg.key);
     if (result != ERROR_SUCCESS && result != ERROR_FILE_NOT_FOUND)
         return "cannot tell whether the key " + keyText(reg.key) + " exists: RegOpenKeyExW gave " +
                std::to_string(result);

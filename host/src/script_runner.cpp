@@ -57,7 +57,7 @@ const bool DefaultView32 = LayerBuilt || sizeof(void*) == 4;
 template <typename T>
 std::string layerSkipNote(const T&) {
     if constexpr (std::is_base_of_v<LayerControl, T>)
-        return std::string("needs the portable layer's ") + T::needs;
+        return std::string("needs the portable layer's ") + T::Needs;
     else
         return "holds only with the portable layer";
 }

@@ -52,7 +52,7 @@ std::u16string Instance::DebugLine::text() const {
 
 Instance::DebugLine Instance::debugLine(int item) {
     auto get = module_.entry<DebugItemEntry>("GetDebugItem");
-    std::vector<char16_t> store(DebugLineChars + fill::guardSize, LineFill);
+    std::vector<char16_t> store(DebugLineChars + Fill::GuardSize, LineFill);
     get(reinterpret_cast<LPWSTR>(store.data()), record_, item);
     DebugLine line;
     line.buffer.assign(store.begin(), store.begin() + DebugLineChars);

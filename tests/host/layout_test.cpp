@@ -65,9 +65,9 @@ INSTANTIATE_TEST_SUITE_P(PointerSizes, Layout, testing::ValuesIn(HostOffsets),
 // The build's own layout is the one for its pointer size.
 TEST(Layout, ThisBuildUsesItsPointerSize) {
     const Expected& mine = HostOffsets[sizeof(void*) == 4 ? 0 : 1];
-    EXPECT_EQ(hv::hostLayout.pointerSize, sizeof(void*));
-    EXPECT_EQ(hv::hostLayout.currentKey, mine.currentKey);
-    EXPECT_EQ(hv::hostLayout.use64BitView, mine.use64BitView);
+    EXPECT_EQ(hv::BuildLayout.pointerSize, sizeof(void*));
+    EXPECT_EQ(hv::BuildLayout.currentKey, mine.currentKey);
+    EXPECT_EQ(hv::BuildLayout.use64BitView, mine.use64BitView);
 }
 
 // The root index sits unaligned at byte 6, little-endian; the host's own bytes keep a pattern.
@@ -76,7 +76,7 @@ TEST(Layout, RootKeyRecordBytes) {
     ASSERT_EQ(r.size(), 16u);
     EXPECT_EQ(r[0], 16);
     EXPECT_EQ(r[1], 0);
-    for (int i : {2, 3, 4, 5, 10, 15}) EXPECT_EQ(r[i], hv::fill::hostBytes) << "byte " << i;
+    for (int i : {2, 3, 4, 5, 10, 15}) EXPECT_EQ(r[i], hv::Fill::HostBytes) << "byte " << i;
     EXPECT_EQ((std::vector<uint8_t>(r.begin() + 6, r.begin() + 10)),
               (std::vector<uint8_t>{1, 2, 3, 4}));
 }

@@ -128,7 +128,7 @@ TEST(ScriptParser, LinesCommentsAndEcho) {
     EXPECT_EQ(as<Echo>(s[1]).text, "say \"hi\" # not a comment");
     as<New>(s[2]);
     EXPECT_FALSE(as<Buffers>(s[3]).lend);
-    EXPECT_EQ(as<Poke>(s[4]).offset, hv::hostLayout.rootKeyIndex);
+    EXPECT_EQ(as<Poke>(s[4]).offset, hv::BuildLayout.rootKeyIndex);
     EXPECT_EQ(as<Poke>(s[4]).value, 9u);
 }
 
@@ -166,7 +166,7 @@ TEST(ScriptParser, RegistryValueData) {
         {"bytes dword \"34 12\"", REG_DWORD, bytes({0x34, 0x12})},
         {"bytes none \"\"", REG_NONE, {}},
         {"bytes dword_be \"00\"", REG_DWORD_BIG_ENDIAN, bytes({0})},
-        {"bytes 12345 \"AB\"", 12345, bytes({0xAB})},
+        {"bytes link \"AB\"", REG_LINK, bytes({0xAB})},
     };
     for (const Row& row : table) {
         SCOPED_TRACE(row.data);

@@ -20,16 +20,16 @@ using Slot = intptr_t;
 
 // Byte patterns the host fills its memory with, so that tests can tell a byte the module wrote
 // from one it left alone.
-namespace fill {
-constexpr uint8_t record = 0xCC;     // the instance record before CreateRunObject
-constexpr uint8_t runHeader = 0xEE;  // the run header around its services
-constexpr uint8_t infos = 0xA5;      // the RunObjectInfos block before GetRunObjectInfos
-constexpr uint8_t buffer = 0xBE;     // a lent string buffer
-constexpr uint8_t hostBytes = 0xAB;  // host-owned bytes of a RootKeyParam record
-constexpr uint8_t editor = 0xED;     // the editor structure around its fields
-constexpr uint8_t guard = 0xFD;      // sentinels around records and buffers
-constexpr size_t guardSize = 16;
-}  // namespace fill
+namespace Fill {
+constexpr uint8_t Record = 0xCC;           // the instance record before CreateRunObject
+constexpr uint8_t RunHeader = 0xEE;        // the run header around its services
+constexpr uint8_t Infos = 0xA5;            // the RunObjectInfos block before GetRunObjectInfos
+constexpr uint8_t Buffer = 0xBE;           // a lent string buffer
+constexpr uint8_t HostBytes = 0xAB;        // host-owned bytes of a RootKeyParam record
+constexpr uint8_t EditorStructure = 0xED;  // the editor structure around its fields
+constexpr uint8_t Guard = 0xFD;            // sentinels around records and buffers
+constexpr size_t GuardSize = 16;
+}  // namespace Fill
 
 // One parameter of an event, as the editor stored it.
 struct Param {
@@ -101,8 +101,8 @@ public:
     struct Tables {
         std::vector<Slot> conditions, actions, expressions;  // each without its null end
         bool conditionsEnd, actionsEnd, expressionsEnd;      // a null entry follows the last one
-        // The whole block as the module left it (filled with fill::infos before), followed by
-        // fill::guardSize bytes that the module must not write.
+        // The whole block as the module left it (filled with Fill::Infos before), followed by
+        // Fill::GuardSize bytes that the module must not write.
         std::vector<uint8_t> block;
         int16_t infosResult;  // what GetRunObjectInfos returned
     };
@@ -164,16 +164,16 @@ public:
     // The record as the module sees it.
     uint8_t* record() { return record_; }
     size_t recordSize() const { return recordSize_; }
-    uint32_t rootKeyIndex() const { return readAt<uint32_t>(record_, hostLayout.rootKeyIndex); }
+    uint32_t rootKeyIndex() const { return readAt<uint32_t>(record_, BuildLayout.rootKeyIndex); }
     const char16_t* currentKey() const {
-        return readAt<const char16_t*>(record_, hostLayout.currentKey);
+        return readAt<const char16_t*>(record_, BuildLayout.currentKey);
     }
-    uint32_t lastError() const { return readAt<uint32_t>(record_, hostLayout.lastError); }
-    uint32_t use64BitView() const { return readAt<uint32_t>(record_, hostLayout.use64BitView); }
-    uint16_t headerFlags() const { return readAt<uint16_t>(record_, hostLayout.headerFlags); }
-    void setRootKeyIndex(uint32_t value) { writeAt(record_, hostLayout.rootKeyIndex, value); }
-    void setLastError(uint32_t value) { writeAt(record_, hostLayout.lastError, value); }
-    void setHeaderFlags(uint16_t value) { writeAt(record_, hostLayout.headerFlags, value); }
+    uint32_t lastError() const { return readAt<uint32_t>(record_, BuildLayout.lastError); }
+    uint32_t use64BitView() const { return readAt<uint32_t>(record_, BuildLayout.use64BitView); }
+    uint16_t headerFlags() const { return readAt<uint16_t>(record_, BuildLayout.headerFlags); }
+    void setRootKeyIndex(uint32_t value) { writeAt(record_, BuildLayout.rootKeyIndex, value); }
+    void setLastError(uint32_t value) { writeAt(record_, BuildLayout.lastError, value); }
+    void setHeaderFlags(uint16_t value) { writeAt(record_, BuildLayout.headerFlags, value); }
 
     // The saved state through SaveRunObject and LoadRunObject, on a file handle the host opens
     // (CreateFileW) and closes: the entry point's result, or -1 when the file cannot be opened

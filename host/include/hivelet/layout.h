@@ -80,7 +80,7 @@ constexpr HostLayout layoutFor(size_t p) {
 }
 
 // The layout of this build.
-constexpr HostLayout hostLayout = layoutFor(sizeof(void*));
+constexpr HostLayout BuildLayout = layoutFor(sizeof(void*));
 
 // Reads and writes of host fields at byte offsets; memcpy, since many are not aligned.
 template <typename T>

@@ -102,18 +102,18 @@ struct Registry {
     std::vector<uint8_t> data;  // the value's bytes exactly as stored
 };
 
-// The lines of the portable layer's own test control; `needs` says why a build without it
+// The lines of the portable layer's own test control; `Needs` says why a build without it
 // skips them.
 struct LayerControl {};
 
 struct Deny : LayerControl {
-    static constexpr const char* needs = "access control";
+    static constexpr const char* Needs = "access control";
     RegistryKey key;
     uint32_t rights = 0;
 };
 
 struct Fail : LayerControl {
-    static constexpr const char* needs = "fault injection";
+    static constexpr const char* Needs = "fault injection";
     std::string function;
     unsigned nth = 1;  // 1 for the next call
     long code = 0;
@@ -121,14 +121,14 @@ struct Fail : LayerControl {
 
 // layer hide|unhide NAME.
 struct Hide : LayerControl {
-    static constexpr const char* needs = "hidden exports";
+    static constexpr const char* Needs = "hidden exports";
     std::string name;
     bool hide = true;
 };
 
 // layer version fail|normal|platform N.
 struct Version : LayerControl {
-    static constexpr const char* needs = "GetVersionExW settings";
+    static constexpr const char* Needs = "GetVersionExW settings";
     enum class How { Fail, Normal, Platform };
     How how = How::Normal;
     uint32_t platform = 0;
@@ -136,13 +136,13 @@ struct Version : LayerControl {
 
 // layer expect handles N.
 struct Handles : LayerControl {
-    static constexpr const char* needs = "handle count";
+    static constexpr const char* Needs = "handle count";
     size_t count = 0;
 };
 
 // layer expect calls FUNCTION N | FUNCTION mask M.
 struct Calls : LayerControl {
-    static constexpr const char* needs = "call journal";
+    static constexpr const char* Needs = "call journal";
     std::string function;
     bool mask = false;
     uint64_t number = 0;  // the count, or the mask every call must carry
