@@ -43,6 +43,8 @@ void walk(const std::vector<MenuEntry>& items, std::vector<std::u16string>& path
         visit(item, path);
         if (item.kind != MenuEntry::Kind::Popup) continue;
         path.push_back(item.text);
+    std::string menu;
+    for (const std::u16string& t : path) menu += (menu.empty() ? "" : ", ") + quote(t);
         walk(item.items, path, visit);
         path.pop_back();
     }
@@ -96,13 +98,6 @@ void printItem(Catalogue& catalogue, EventKind kind, const MenuEntry& item, size
             << toUtf8(event->titles[i]) << "\"\n";
 }
 
-// Texts as a JSON list.
-std::string jsonList(const std::vector<std::u16string>& texts) {
-    std::string out;
-    for (const std::u16string& t : texts) out += (out.empty() ? "" : ", ") + quote(t);
-    return "[" + out + "]";
-}
-
 void printEventJson(Catalogue& catalogue, EventKind kind, const MenuEntry& item,
                     std::vector<std::u16string> path, bool& first, std::ostream& out) {
     int code = 0;
@@ -110,9 +105,11 @@ void printEventJson(Catalogue& catalogue, EventKind kind, const MenuEntry& item,
     if (!event)
         throw std::runtime_error("menu item " + std::to_string(item.id) + " maps to no event");
     path.push_back(item.text);
+    std::string menu;
+    for (const std::u16string& t : path) menu += (menu.empty() ? "" : ", ") + quote(t);
     out << (first ? "" : ",\n") << "    {\"kind\": \"" << kindName(kind) << "\", \"code\": " << code
         << ", \"routine\": \"" << routineAt(kind, code) << "\", \"menuId\": " << item.id
-        << ", \"menu\": " << jsonList(path)
+        << ", \"menu\": [" << menu << "]"
         << ", \"flags\": " << static_cast<uint16_t>(event->entry.flags)
         << ", \"text\": " << quote(event->text) << ", \"params\": [";
     for (size_t i = 0; i < event->titles.size(); ++i)

@@ -34,13 +34,6 @@ BOOL CALLBACK findDialog(HWND window, LPARAM found) {
     return FALSE;
 }
 
-// The thread's dialog on top, or null.
-HWND threadDialog() {
-    HWND found = nullptr;
-    EnumThreadWindows(GetCurrentThreadId(), findDialog, reinterpret_cast<LPARAM>(&found));
-    return found;
-}
-
 std::vector<std::u16string> listItems(HWND list) {
     std::vector<std::u16string> items;
     auto count = static_cast<int>(SendMessageW(list, LB_GETCOUNT, 0, 0));
@@ -108,7 +101,9 @@ void perform(User& user, HWND dialog, const UserStep& step) {
 
 // One look or one step per tick.
 void CALLBACK onTick(HWND, UINT, UINT_PTR, DWORD) {
-    HWND dialog = activeUser ? threadDialog() : nullptr;
+    HWND dialog = nullptr;  // the thread's dialog on top
+    if (activeUser)
+        EnumThreadWindows(GetCurrentThreadId(), findDialog, reinterpret_cast<LPARAM>(&dialog));
     if (!dialog) return;
     User& user = *activeUser;
     DialogSeen& seen = user.seen;

@@ -36,16 +36,11 @@ Instance* running = nullptr;
 // A text of at most `limit` UTF-16 units at an address that may be unaligned; `terminated` tells
 // whether a zero ended it.
 std::u16string readText(const uint8_t* p, size_t limit, bool* terminated) {
-    std::u16string text;
-    *terminated = false;
-    for (size_t i = 0; i < limit; ++i) {
-        char16_t unit = readAt<char16_t>(p, 2 * i);
-        if (unit == 0) {
-            *terminated = true;
-            break;
-        }
-        text += unit;
-    }
+    size_t n = 0;
+    while (n < limit && readAt<char16_t>(p, 2 * n)) ++n;
+    *terminated = n < limit;
+    std::u16string text(n, u'\0');
+    std::memcpy(&text[0], p, 2 * n);
     return text;
 }
 

@@ -48,7 +48,9 @@ public:
     explicit Operands(std::vector<Token> tokens) : tokens_(std::move(tokens)) {}
     size_t left() const { return tokens_.size() - at_; }
     // The operand `ahead` places on, or null past the end.
-    const Token* peek(size_t ahead = 0) const;
+    const Token* peek(size_t ahead = 0) const {
+        return at_ + ahead < tokens_.size() ? &tokens_[at_ + ahead] : nullptr;
+    }
     // Takes the next operand, or gives null at the end.
     const Token* next() { return at_ < tokens_.size() ? &tokens_[at_++] : nullptr; }
     // The next operand when it is a bare word, else "" (nothing is taken).
@@ -94,7 +96,6 @@ Command parseExpect(Operands& in);
 Command parseRegistry(Operands& in);
 Command parseLayer(Operands& in);
 Command parseParam(Operands& in);
-StateFile parseStateFile(Operands& in, bool save);
 FileBytes parseFileBytes(Operands& in, bool check);
 // The parser of the command named `name`, or null.
 Parser findCommand(const std::string& name);

@@ -99,10 +99,6 @@ std::vector<Token> lex(const std::string& line, size_t pos, size_t* end) {
     return tokens;
 }
 
-const Token* Operands::peek(size_t ahead) const {
-    return at_ + ahead < tokens_.size() ? &tokens_[at_ + ahead] : nullptr;
-}
-
 std::string Operands::word() {
     const Token* t = peek();
     if (!t || t->quoted) return std::string();
