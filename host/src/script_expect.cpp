@@ -119,45 +119,6 @@ std::string numberWhy(const char* what, int64_t wanted, uint64_t actual) {
                   what + (" " + std::to_string(wanted)), std::to_string(actual));
 }
 
-// Integers compare at the width of the routine's result: 16 bits for actions, 32 otherwise.
-std::string resultWhy(Session& s, const ExpectResult& line) {
-    const Outcome& o = s.lastEvent();
-    if (auto* text = std::get_if<std::u16string>(&line.value))
-        return textWhy(s, *text, quote(*text));
-    if (auto* truth = std::get_if<bool>(&line.value))
-        return unless(s.lastKind() == EventKind::Condition && o.asCondition() == (*truth ? 1 : 0),
-                      *truth ? "true" : "false", got(s));
-    int64_t n = std::get<int64_t>(line.value);
-    auto wanted = static_cast<uint32_t>(n);
-    bool same = s.lastKind() == EventKind::Action
-                    ? static_cast<uint16_t>(o.asAction()) == static_cast<uint16_t>(wanted)
-                    : !o.isText && static_cast<uint32_t>(o.asInteger()) == wanted;
-    return unless(same, std::to_string(n), got(s));
-}
-
-// The system's message is asked for here, so the check holds for every system's texts.
-std::string fieldWhy(Session& s, const ExpectNumber& line) {
-    Instance& instance = s.instance();
-    switch (line.of) {
-        case ExpectNumber::Of::LastError:
-            return numberWhy("lastError", line.value, instance.lastError());
-        case ExpectNumber::Of::RootKeyIndex:
-            return numberWhy("rootKeyIndex", line.value, instance.rootKeyIndex());
-        case ExpectNumber::Of::Use64BitView:
-            return numberWhy("use64BitView", line.value, instance.use64BitView());
-        case ExpectNumber::Of::Fetches: {
-            const Outcome& o = s.lastEvent();
-            return numberWhy("parameter fetches", line.value,
-                             o.parameterFetches + o.expressionFetches);
-        }
-        default: break;
-    }
-    auto code = static_cast<uint32_t>(line.value);
-    std::u16string wanted = systemMessage(code);
-    return textWhy(s, wanted,
-                   "the system's message for " + std::to_string(code) + ", " + quote(wanted));
-}
-
 // Buffer sizes as "[1024 8]".
 std::string listed(const std::vector<size_t>& sizes) {
     std::string out;
@@ -204,12 +165,45 @@ Command parseExpect(Operands& in) {
     return parseResult(in);
 }
 
+// Integers compare at the width of the routine's result: 16 bits for actions, 32 otherwise.
 void run(Session& s, const Step& step, const ExpectResult& line) {
-    s.checked(step, resultWhy(s, line));
+    const Outcome& o = s.lastEvent();
+    if (auto* text = std::get_if<std::u16string>(&line.value))
+        return s.checked(step, textWhy(s, *text, quote(*text)));
+    if (auto* truth = std::get_if<bool>(&line.value))
+        return s.checked(step, unless(s.lastKind() == EventKind::Condition &&
+                                          o.asCondition() == (*truth ? 1 : 0),
+                                      *truth ? "true" : "false", got(s)));
+    int64_t n = std::get<int64_t>(line.value);
+    auto wanted = static_cast<uint32_t>(n);
+    bool same = s.lastKind() == EventKind::Action
+                    ? static_cast<uint16_t>(o.asAction()) == static_cast<uint16_t>(wanted)
+                    : !o.isText && static_cast<uint32_t>(o.asInteger()) == wanted;
+    return s.checked(step, unless(same, std::to_string(n), got(s)));
 }
 
+// The system's message is asked for here, so the check holds for every system's texts.
 void run(Session& s, const Step& step, const ExpectNumber& line) {
-    s.checked(step, fieldWhy(s, line));
+    Instance& instance = s.instance();
+    switch (line.of) {
+        case ExpectNumber::Of::LastError:
+            return s.checked(step, numberWhy("lastError", line.value, instance.lastError()));
+        case ExpectNumber::Of::RootKeyIndex:
+            return s.checked(step, numberWhy("rootKeyIndex", line.value, instance.rootKeyIndex()));
+        case ExpectNumber::Of::Use64BitView:
+            return s.checked(step, numberWhy("use64BitView", line.value, instance.use64BitView()));
+        case ExpectNumber::Of::Fetches: {
+            const Outcome& o = s.lastEvent();
+            return s.checked(step, numberWhy("parameter fetches", line.value,
+                                             o.parameterFetches + o.expressionFetches));
+        }
+        default: break;
+    }
+    auto code = static_cast<uint32_t>(line.value);
+    std::u16string wanted = systemMessage(code);
+    return s.checked(
+        step, textWhy(s, wanted,
+                      "the system's message for " + std::to_string(code) + ", " + quote(wanted)));
 }
 
 void run(Session& s, const Step& step, const ExpectBuffers& line) {
