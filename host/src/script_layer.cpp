@@ -80,9 +80,7 @@ Command parseVersion(Operands& in) {
     std::string how = in.word();
     if (how != "fail" && how != "normal" && how != "platform") refuse(usage);
     Version version;
-    version.how = how == "fail"     ? Version::How::Fail
-                  : how == "normal" ? Version::How::Normal
-                                    : Version::How::Platform;
+    version.fail = how == "fail";
     if (how == "platform") version.platform = static_cast<uint32_t>(in.integer(usage));
     in.end();
     return version;
@@ -161,13 +159,11 @@ void run(Session& session, const Step& step, const Hide& line) {
 }
 
 void run(Session& session, const Step& step, const Version& line) {
-    w32test::setVersionFault(line.how == Version::How::Fail);
-    if (line.how == Version::How::Normal) w32test::setPlatformId(VER_PLATFORM_WIN32_NT);
-    if (line.how == Version::How::Platform) w32test::setPlatformId(line.platform);
+    w32test::setVersionFault(line.fail);
+    if (!line.fail) w32test::setPlatformId(line.platform);
     session.layerChanges.version = true;
-    const char* const shown[] = {"GetVersionExW fails", "GetVersionExW answers as usual",
-                                 "GetVersionExW reports this platform"};
-    session.show(step, shown[static_cast<size_t>(line.how)]);
+    std::string platform = "GetVersionExW reports platform " + std::to_string(line.platform);
+    session.show(step, line.fail ? "GetVersionExW fails" : platform);
 }
 
 void run(Session& session, const Step& step, const Handles& line) {

@@ -1,5 +1,7 @@
 // Registry lines: set-up and checks that go through the Win32 registry functions themselves, so
 // that one script runs alike against the portable layer and against a real registry.
+#include <iterator>
+
 #include "internal.h"
 #include "script_internal.h"
 
@@ -98,19 +100,15 @@ void parseData(Operands& in, Registry& reg) {
 // The forms after `reg`: "key create", "value set", "expect key" ...
 Form parseForm(Operands& in) {
     std::string first = in.word();
-    if (first == "expect") {
-        std::string what = in.word();
-        if (what != "key" && what != "value") refuse("reg expect takes key or value");
-        return what == "key" ? Form::ExpectKey : Form::ExpectValue;
-    }
-    if (first != "key" && first != "value") refuse("reg takes key, value or expect");
-    std::string verb = in.word();
-    const char* verbs = first == "key" ? "create" : "set";
-    if (verb != verbs && verb != "delete")
-        refuse("reg " + first + " takes " + verbs + " or delete");
-    bool remove = verb == "delete";
-    return first == "key" ? (remove ? Form::DeleteKey : Form::CreateKey)
-                          : (remove ? Form::DeleteValue : Form::SetValue);
+    const char* seconds = first == "key"      ? "create or delete"
+                          : first == "value"  ? "set or delete"
+                          : first == "expect" ? "key or value"
+                                              : nullptr;
+    if (!seconds) refuse("reg takes key, value or expect");
+    std::string form = first + " " + in.word();
+    for (size_t i = 0; i < std::size(FormNames); ++i)
+        if (form == FormNames[i]) return static_cast<Form>(i);
+    refuse("reg " + first + " takes " + seconds);
 }
 
 // The key as messages name it: HKEY_CURRENT_USER "Software\\X" view64.

@@ -126,12 +126,12 @@ struct Hide : LayerControl {
     bool hide = true;
 };
 
-// layer version fail|normal|platform N.
+// layer version fail|normal|platform N: normal is platform 2 (NT), as at start; fail leaves the
+// platform as it is.
 struct Version : LayerControl {
     static constexpr const char* Needs = "GetVersionExW settings";
-    enum class How { Fail, Normal, Platform };
-    How how = How::Normal;
-    uint32_t platform = 0;
+    bool fail = false;
+    uint32_t platform = 2;
 };
 
 // layer expect handles N.
