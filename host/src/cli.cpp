@@ -43,8 +43,6 @@ void walk(const std::vector<MenuEntry>& items, std::vector<std::u16string>& path
         visit(item, path);
         if (item.kind != MenuEntry::Kind::Popup) continue;
         path.push_back(item.text);
-    std::string menu;
-    for (const std::u16string& t : path) menu += (menu.empty() ? "" : ", ") + quote(t);
         walk(item.items, path, visit);
         path.pop_back();
     }
