@@ -9,7 +9,7 @@ namespace bench {
 
 namespace {
 
-constexpr const hv::HostLayout& L = hv::hostLayout;
+constexpr const hv::HostLayout& L = hv::BuildLayout;
 
 template <typename T>
 void store(std::vector<uint8_t>& bytes, size_t offset, T value) {
@@ -66,7 +66,7 @@ Instance::~Instance() { destroy_(record(), 0); }
 void Instance::setParameters(const std::vector<Slot>& values) {
     count_ = 0;
     for (Slot v : values)
-        if (count_ < kMaxParameters) parameters_[count_++] = v;
+        if (count_ < MaxParameters) parameters_[count_++] = v;
     next_ = 0;
 }
 

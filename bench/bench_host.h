@@ -60,8 +60,8 @@ private:
     std::vector<uint8_t> record_;
     std::vector<uint8_t> runHeader_;
     uint16_t* flags_;
-    static constexpr unsigned kMaxParameters = 8;
-    Slot parameters_[kMaxParameters] = {};
+    static constexpr unsigned MaxParameters = 8;
+    Slot parameters_[MaxParameters] = {};
     unsigned count_ = 0;
     unsigned next_ = 0;
     std::vector<WCHAR> buffer_;

@@ -14,7 +14,7 @@ namespace bench {
 
 class BlockClock {
 public:
-    static constexpr double kPercentile = 0.10;
+    static constexpr double Percentile = 0.10;
 
     // `block` calls per block: enough for some microseconds, so that reading the clock once a
     // block costs little beside them.
@@ -31,7 +31,7 @@ public:
     // Sets the counter "fast_ns": the time per call of the fast blocks.
     void report(benchmark::State& state) {
         if (blocks_.empty()) return;
-        auto at = blocks_.begin() + static_cast<long>(kPercentile * (blocks_.size() - 1));
+        auto at = blocks_.begin() + static_cast<long>(Percentile * (blocks_.size() - 1));
         std::nth_element(blocks_.begin(), at, blocks_.end());
         state.counters["fast_ns"] = *at;
     }

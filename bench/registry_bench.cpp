@@ -29,29 +29,29 @@ using bench::textSlot;
 
 namespace {
 
-constexpr double kPairTarget = 1.10;     // module time / raw time per routine, side by side
-constexpr double kScalingTarget = 1.5;   // time per key, 50,000 subkeys / 5,000 subkeys
-constexpr uint32_t kCurrentUser = 2;     // HKEY_CURRENT_USER's index among the root keys
-constexpr REGSAM kReadAccess = KEY_READ;
-constexpr REGSAM kWriteAccess = KEY_ALL_ACCESS;
-constexpr REGSAM kWalkAccess = DELETE | KEY_ENUMERATE_SUB_KEYS;
+constexpr double PairTarget = 1.10;    // module time / raw time per routine, side by side
+constexpr double ScalingTarget = 1.5;  // time per key, 50,000 subkeys / 5,000 subkeys
+constexpr uint32_t CurrentUser = 2;    // HKEY_CURRENT_USER's index among the root keys
+constexpr REGSAM ReadAccess = KEY_READ;
+constexpr REGSAM WriteAccess = KEY_ALL_ACCESS;
+constexpr REGSAM WalkAccess = DELETE | KEY_ENUMERATE_SUB_KEYS;
 
-const WCHAR kRootName[] = TEXT("HKEY_CURRENT_USER");
-const WCHAR kSettings[] = TEXT("Software\\HiveletBench\\Settings");
-const WCHAR kWide[] = TEXT("Software\\HiveletBench\\Wide");
-const WCHAR kDeep[] = TEXT("HiveletBenchDeep");  // one level below the root
-const WCHAR kDwordName[] = TEXT("Count");
-const WCHAR kStringName[] = TEXT("Title");
-const WCHAR kDwordTarget[] = TEXT("Counter");
-const WCHAR kStringTarget[] = TEXT("Label");
-const WCHAR kTitle[] = TEXT("Hivelet benchmark: a title of forty chars");
-const WCHAR kLabel[] = TEXT("written by the benchmark");
-constexpr DWORD kCount = 42;
-constexpr DWORD kInvalidParameters = 40;  // lastError of a routine refusing its parameters
-constexpr Slot kWrittenDword = 7;
+const WCHAR RootName[] = TEXT("HKEY_CURRENT_USER");
+const WCHAR Settings[] = TEXT("Software\\HiveletBench\\Settings");
+const WCHAR Wide[] = TEXT("Software\\HiveletBench\\Wide");
+const WCHAR Deep[] = TEXT("HiveletBenchDeep");  // one level below the root
+const WCHAR DwordName[] = TEXT("Count");
+const WCHAR StringName[] = TEXT("Title");
+const WCHAR DwordTarget[] = TEXT("Counter");
+const WCHAR StringTarget[] = TEXT("Label");
+const WCHAR Title[] = TEXT("Hivelet benchmark: a title of forty chars");
+const WCHAR Label[] = TEXT("written by the benchmark");
+constexpr DWORD Count = 42;
+constexpr DWORD InvalidParameters = 40;  // lastError of a routine refusing its parameters
+constexpr Slot WrittenDword = 7;
 
 // Deepest key the registry allows: 512 levels below a root.
-constexpr unsigned kDeepLevels = 512;
+constexpr unsigned DeepLevels = 512;
 
 template <typename T>
 size_t length(const T* text) {
@@ -62,7 +62,7 @@ size_t length(const T* text) {
 
 LONG rawReadDword(HKEY root, const WCHAR* path, const WCHAR* name, DWORD* out) {
     HKEY key;
-    LONG code = RegOpenKeyExW(root, path, 0, kReadAccess, &key);
+    LONG code = RegOpenKeyExW(root, path, 0, ReadAccess, &key);
     if (code != ERROR_SUCCESS) return code;
     DWORD type = 0, size = sizeof(*out);
     code = RegQueryValueExW(key, name, nullptr, &type, reinterpret_cast<BYTE*>(out), &size);
@@ -72,7 +72,7 @@ LONG rawReadDword(HKEY root, const WCHAR* path, const WCHAR* name, DWORD* out) {
 
 LONG rawReadString(HKEY root, const WCHAR* path, const WCHAR* name, WCHAR* buffer) {
     HKEY key;
-    LONG code = RegOpenKeyExW(root, path, 0, kReadAccess, &key);
+    LONG code = RegOpenKeyExW(root, path, 0, ReadAccess, &key);
     if (code != ERROR_SUCCESS) return code;
     DWORD type = 0, size = 0;
     code = RegQueryValueExW(key, name, nullptr, &type, nullptr, &size);
@@ -85,7 +85,7 @@ LONG rawReadString(HKEY root, const WCHAR* path, const WCHAR* name, WCHAR* buffe
 
 LONG rawWriteDword(HKEY root, const WCHAR* path, const WCHAR* name, DWORD value) {
     HKEY key;
-    LONG code = RegCreateKeyExW(root, path, 0, nullptr, 0, kWriteAccess, nullptr, &key, nullptr);
+    LONG code = RegCreateKeyExW(root, path, 0, nullptr, 0, WriteAccess, nullptr, &key, nullptr);
     if (code != ERROR_SUCCESS) return code;
     code = RegSetValueExW(key, name, 0, REG_DWORD, reinterpret_cast<const BYTE*>(&value),
                           sizeof(value));
@@ -95,7 +95,7 @@ LONG rawWriteDword(HKEY root, const WCHAR* path, const WCHAR* name, DWORD value)
 
 LONG rawWriteString(HKEY root, const WCHAR* path, const WCHAR* name, const WCHAR* text) {
     HKEY key;
-    LONG code = RegCreateKeyExW(root, path, 0, nullptr, 0, kWriteAccess, nullptr, &key, nullptr);
+    LONG code = RegCreateKeyExW(root, path, 0, nullptr, 0, WriteAccess, nullptr, &key, nullptr);
     if (code != ERROR_SUCCESS) return code;
     DWORD type = REG_SZ, size = 0;
     RegQueryValueExW(key, name, nullptr, &type, nullptr, &size);
@@ -107,7 +107,7 @@ LONG rawWriteString(HKEY root, const WCHAR* path, const WCHAR* name, const WCHAR
 
 LONG rawCreateKey(HKEY root, const WCHAR* path) {
     HKEY key;
-    LONG code = RegCreateKeyExW(root, path, 0, nullptr, 0, kWriteAccess, nullptr, &key, nullptr);
+    LONG code = RegCreateKeyExW(root, path, 0, nullptr, 0, WriteAccess, nullptr, &key, nullptr);
     if (code == ERROR_SUCCESS) RegCloseKey(key);
     return code;
 }
@@ -115,7 +115,7 @@ LONG rawCreateKey(HKEY root, const WCHAR* path) {
 // The walk the module makes to delete a key tree, first subkey first, without the module.
 LONG rawDeleteTree(HKEY parent, const WCHAR* path) {
     HKEY key;
-    LONG code = RegOpenKeyExW(parent, path, 0, kWalkAccess, &key);
+    LONG code = RegOpenKeyExW(parent, path, 0, WalkAccess, &key);
     if (code != ERROR_SUCCESS) return code;
     WCHAR name[1024];
     for (;;) {
@@ -136,14 +136,14 @@ LONG rawDeleteTree(HKEY parent, const WCHAR* path) {
 
 bool prepareValues() {
     HKEY key;
-    if (RegCreateKeyExW(HKEY_CURRENT_USER, kSettings, 0, nullptr, 0, kWriteAccess, nullptr, &key,
+    if (RegCreateKeyExW(HKEY_CURRENT_USER, Settings, 0, nullptr, 0, WriteAccess, nullptr, &key,
                         nullptr) != ERROR_SUCCESS)
         return false;
-    DWORD count = kCount;
-    bool ok = RegSetValueExW(key, kDwordName, 0, REG_DWORD, reinterpret_cast<BYTE*>(&count),
+    DWORD count = Count;
+    bool ok = RegSetValueExW(key, DwordName, 0, REG_DWORD, reinterpret_cast<BYTE*>(&count),
                              sizeof(count)) == ERROR_SUCCESS;
-    ok = ok && RegSetValueExW(key, kStringName, 0, REG_SZ, reinterpret_cast<const BYTE*>(kTitle),
-                              static_cast<DWORD>((length(kTitle) + 1) * sizeof(WCHAR))) == 0;
+    ok = ok && RegSetValueExW(key, StringName, 0, REG_SZ, reinterpret_cast<const BYTE*>(Title),
+                              static_cast<DWORD>((length(Title) + 1) * sizeof(WCHAR))) == 0;
     // A few neighbours, so that the values looked up are not alone in their key.
     const WCHAR* others[] = {TEXT("Width"), TEXT("Height"), TEXT("Left"), TEXT("Top"),
                              TEXT("Theme"), TEXT("Language")};
@@ -168,14 +168,14 @@ std::vector<std::u16string> subkeyNames(unsigned count) {
 // `path` below HKEY_CURRENT_USER with one level of `names` below it.
 bool buildWide(const WCHAR* path, const std::vector<std::u16string>& names) {
     HKEY parent;
-    if (RegCreateKeyExW(HKEY_CURRENT_USER, path, 0, nullptr, 0, kWriteAccess, nullptr, &parent,
+    if (RegCreateKeyExW(HKEY_CURRENT_USER, path, 0, nullptr, 0, WriteAccess, nullptr, &parent,
                         nullptr) != ERROR_SUCCESS)
         return false;
     bool ok = true;
     for (const std::u16string& name : names) {
         HKEY child;
         ok = ok && RegCreateKeyExW(parent, reinterpret_cast<const WCHAR*>(name.c_str()), 0,
-                                   nullptr, 0, kWriteAccess, nullptr, &child,
+                                   nullptr, 0, WriteAccess, nullptr, &child,
                                    nullptr) == ERROR_SUCCESS;
         if (ok) RegCloseKey(child);
     }
@@ -186,13 +186,13 @@ bool buildWide(const WCHAR* path, const std::vector<std::u16string>& names) {
 // A chain of `levels` keys from `path` (directly below HKEY_CURRENT_USER) down.
 bool buildDeep(const WCHAR* path, unsigned levels) {
     HKEY key;
-    if (RegCreateKeyExW(HKEY_CURRENT_USER, path, 0, nullptr, 0, kWriteAccess, nullptr, &key,
+    if (RegCreateKeyExW(HKEY_CURRENT_USER, path, 0, nullptr, 0, WriteAccess, nullptr, &key,
                         nullptr) != ERROR_SUCCESS)
         return false;
     bool ok = true;
     for (unsigned level = 2; ok && level <= levels; ++level) {
         HKEY child;
-        ok = RegCreateKeyExW(key, TEXT("Level"), 0, nullptr, 0, kWriteAccess, nullptr, &child,
+        ok = RegCreateKeyExW(key, TEXT("Level"), 0, nullptr, 0, WriteAccess, nullptr, &child,
                              nullptr) == ERROR_SUCCESS;
         RegCloseKey(key);
         key = child;
@@ -203,7 +203,7 @@ bool buildDeep(const WCHAR* path, unsigned levels) {
 
 bool keyExists(const WCHAR* path) {
     HKEY key;
-    if (RegOpenKeyExW(HKEY_CURRENT_USER, path, 0, kReadAccess, &key) != ERROR_SUCCESS)
+    if (RegOpenKeyExW(HKEY_CURRENT_USER, path, 0, ReadAccess, &key) != ERROR_SUCCESS)
         return false;
     RegCloseKey(key);
     return true;
@@ -216,7 +216,7 @@ bool keyExists(const WCHAR* path) {
 struct Fixture {
     hv::Module& module;
     bench::Instance instance;
-    bench::RootKeyRecord currentUser{kCurrentUser};
+    bench::RootKeyRecord currentUser{CurrentUser};
     WCHAR rawBuffer[256] = {};
 
     explicit Fixture(hv::Module& m) : module(m), instance(m) {}
@@ -227,7 +227,7 @@ struct Fixture {
         if (!setRootKey || !setCurrentKey) return false;
         setRootKey(instance.record(), currentUser.slot(), 0);
         if (instance.lastError() != 0) return false;
-        setCurrentKey(instance.record(), textSlot(kSettings), 0);
+        setCurrentKey(instance.record(), textSlot(Settings), 0);
         return instance.lastError() == 0;
     }
 };
@@ -300,12 +300,12 @@ void registerRaw(const std::string& name, RawCall raw) {
     });
 }
 
-constexpr unsigned kSideBlock = 32;  // calls per block of each side
+constexpr unsigned SideBlock = 32;  // calls per block of each side
 
 template <typename Op>
 double timeBlock(Op op) {
     auto start = std::chrono::steady_clock::now();
-    for (unsigned k = 0; k < kSideBlock; ++k) op();
+    for (unsigned k = 0; k < SideBlock; ++k) op();
     auto stop = std::chrono::steady_clock::now();
     return std::chrono::duration<double, std::nano>(stop - start).count();
 }
@@ -350,8 +350,8 @@ void registerSideBySide(const std::string& name, Prepare prepare, Call call, Raw
                 m = runModule();
             }
             moduleFirst = !moduleFirst;
-            moduleNs.push_back(m / kSideBlock);
-            rawNs.push_back(r / kSideBlock);
+            moduleNs.push_back(m / SideBlock);
+            rawNs.push_back(r / SideBlock);
             ratios.push_back(m / r);
         }
         if (!ratios.empty()) {
@@ -528,7 +528,7 @@ bool addRoutine(bench::RatioReporter& reporter, const std::string& name,
 template <typename Call>
 bool addOwnWork(bench::RatioReporter& reporter, bench::Instance& in, const std::string& name,
                 Prepare prepare, Call call) {
-    auto refused = [&in](Slot) { return in.lastError() == kInvalidParameters; };
+    auto refused = [&in](Slot) { return in.lastError() == InvalidParameters; };
     prepare();
     std::vector<std::string> calls = callsOf([&] { call(); });
     if (!calls.empty() || !refused(0)) {
@@ -575,36 +575,36 @@ int main(int argc, char** argv) {
     };
     Prepare none = parameters({});
     Check dwordRead = [&in](Slot result) {
-        return in.lastError() == 0 && static_cast<DWORD>(result) == kCount;
+        return in.lastError() == 0 && static_cast<DWORD>(result) == Count;
     };
     Check stringRead = [&in](Slot result) {
         const auto* text = reinterpret_cast<const WCHAR*>(result);
         return in.lastError() == 0 && in.textResult() && text &&
-               std::u16string_view(text) == std::u16string_view(kTitle);
+               std::u16string_view(text) == std::u16string_view(Title);
     };
     Check succeeded = [&in](Slot) { return in.lastError() == 0; };
 
     // The raw sequences, each the registry calls of the routines that share it.
     auto readDword = [] {
         DWORD value = 0;
-        return rawReadDword(HKEY_CURRENT_USER, kSettings, kDwordName, &value);
+        return rawReadDword(HKEY_CURRENT_USER, Settings, DwordName, &value);
     };
     auto readString = [rawBuffer] {
-        return rawReadString(HKEY_CURRENT_USER, kSettings, kStringName, rawBuffer);
+        return rawReadString(HKEY_CURRENT_USER, Settings, StringName, rawBuffer);
     };
     auto writeDword = [] {
-        return rawWriteDword(HKEY_CURRENT_USER, kSettings, kDwordTarget, kWrittenDword);
+        return rawWriteDword(HKEY_CURRENT_USER, Settings, DwordTarget, WrittenDword);
     };
     auto writeString = [] {
-        return rawWriteString(HKEY_CURRENT_USER, kSettings, kStringTarget, kLabel);
+        return rawWriteString(HKEY_CURRENT_USER, Settings, StringTarget, Label);
     };
-    auto createKey = [] { return rawCreateKey(HKEY_CURRENT_USER, kSettings); };
+    auto createKey = [] { return rawCreateKey(HKEY_CURRENT_USER, Settings); };
 
     bench::RatioReporter reporter;
-    const Slot rootName = textSlot(kRootName), path = textSlot(kSettings);
-    const Slot dwordName = textSlot(kDwordName), stringName = textSlot(kStringName);
-    const Slot dwordTarget = textSlot(kDwordTarget), stringTarget = textSlot(kStringTarget);
-    const Slot label = textSlot(kLabel);
+    const Slot rootName = textSlot(RootName), path = textSlot(Settings);
+    const Slot dwordName = textSlot(DwordName), stringName = textSlot(StringName);
+    const Slot dwordTarget = textSlot(DwordTarget), stringTarget = textSlot(StringTarget);
+    const Slot label = textSlot(Label);
     bool ok = true;
     ok &= addRoutine(reporter, "ExpGetCurrentDword", "OpenQueryDwordClose",
                      parameters({dwordName}), expression("ExpGetCurrentDword"), readDword,
@@ -619,12 +619,12 @@ int main(int argc, char** argv) {
                      parameters({rootName, path, stringName}), expression("ExpGetString"),
                      readString, stringRead);
     ok &= addRoutine(reporter, "ActSetCurrentDword", "CreateSetDwordClose", none,
-                     action("ActSetCurrentDword", dwordTarget, kWrittenDword), writeDword,
+                     action("ActSetCurrentDword", dwordTarget, WrittenDword), writeDword,
                      succeeded);
     ok &= addRoutine(reporter, "ActSetCurrentString", "CreateProbeSetStringClose", none,
                      action("ActSetCurrentString", stringTarget, label), writeString, succeeded);
     ok &= addRoutine(reporter, "ActSetDword", "CreateSetDwordClose",
-                     parameters({root, path, dwordTarget, kWrittenDword}), action("ActSetDword"),
+                     parameters({root, path, dwordTarget, WrittenDword}), action("ActSetDword"),
                      writeDword, succeeded);
     ok &= addRoutine(reporter, "ActSetString", "CreateProbeSetStringClose",
                      parameters({root, path, stringTarget, label}), action("ActSetString"),
@@ -648,11 +648,11 @@ int main(int argc, char** argv) {
     ok &= addOwnWork(reporter, in, "ExpGetString", parameters({rootName, 0, stringName}),
                      expression("ExpGetString"));
     ok &= addOwnWork(reporter, in, "ActSetCurrentDword", none,
-                     action("ActSetCurrentDword", 0, kWrittenDword));
+                     action("ActSetCurrentDword", 0, WrittenDword));
     ok &= addOwnWork(reporter, in, "ActSetCurrentString", none,
                      action("ActSetCurrentString", stringTarget, 0));
     ok &= addOwnWork(reporter, in, "ActSetDword",
-                     parameters({root, 0, dwordTarget, kWrittenDword}), action("ActSetDword"));
+                     parameters({root, 0, dwordTarget, WrittenDword}), action("ActSetDword"));
     ok &= addOwnWork(reporter, in, "ActSetString", parameters({root, 0, stringTarget, label}),
                      action("ActSetString"));
     ok &= addOwnWork(reporter, in, "ActCreateKey", parameters({root, 0}), action("ActCreateKey"));
@@ -662,15 +662,15 @@ int main(int argc, char** argv) {
     auto small = std::make_shared<std::vector<std::u16string>>(subkeyNames(5000));
     auto large = std::make_shared<std::vector<std::u16string>>(subkeyNames(50000));
     registerDeletion(f, reporter, "Module/DeleteKey/wide:5000", "wide, 5,000 subkeys", 5001, 20,
-                     [small] { return buildWide(kWide, *small); }, kWide);
+                     [small] { return buildWide(Wide, *small); }, Wide);
     registerDeletion(f, reporter, "Module/DeleteKey/wide:50000", "wide, 50,000 subkeys", 50001, 4,
-                     [large] { return buildWide(kWide, *large); }, kWide);
-    registerDeletion(f, reporter, "Module/DeleteKey/deep:512", "deep, 512 levels", kDeepLevels,
-                     100, [] { return buildDeep(kDeep, kDeepLevels); }, kDeep);
+                     [large] { return buildWide(Wide, *large); }, Wide);
+    registerDeletion(f, reporter, "Module/DeleteKey/deep:512", "deep, 512 levels", DeepLevels,
+                     100, [] { return buildDeep(Deep, DeepLevels); }, Deep);
     registerRawDeletion(reporter, "Raw/DeleteWalk/wide:5000", "raw walk, wide, 5,000 subkeys",
-                        5001, 20, [small] { return buildWide(kWide, *small); }, kWide);
+                        5001, 20, [small] { return buildWide(Wide, *small); }, Wide);
     reporter.scaling("time per key, 50,000 / 5,000 subkeys", "Module/DeleteKey/wide:50000",
-                     "Module/DeleteKey/wide:5000", kScalingTarget);
+                     "Module/DeleteKey/wide:5000", ScalingTarget);
     reporter.scaling("module / raw walk, 5,000 subkeys", "Module/DeleteKey/wide:5000",
                      "Raw/DeleteWalk/wide:5000", 0);
 
@@ -680,7 +680,7 @@ int main(int argc, char** argv) {
     benchmark::Initialize(&count, args.data());
     if (benchmark::ReportUnrecognizedArguments(count, args.data())) return 1;
     benchmark::RunSpecifiedBenchmarks(&reporter);
-    reporter.printSummary(std::cout, kPairTarget);
+    reporter.printSummary(std::cout, PairTarget);
     std::cout << "\n";
     reporter.printRatios(std::cout);
     benchmark::Shutdown();

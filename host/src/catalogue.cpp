@@ -47,6 +47,16 @@ private:
     Guarded block_;
 };
 
+// Calls the text entry point `name` as the editor does: the editor structure, `args`, then a
+// lent buffer of `capacity` characters and the capacity; the text it left there.
+template <typename Entry, typename... Args>
+std::u16string textFrom(Module& module, Editor& editor, const std::string& name, int capacity,
+                        Args... args) {
+    TextBuffer buffer(name, capacity);
+    module.entry<Entry>(name.c_str())(editor.structure(), args..., buffer.data(), capacity);
+    return buffer.text();
+}
+
 // Every item of `menu`, nested popups included.
 std::vector<MenuEntry> readMenu(HMENU menu, int depth = 0) {
     std::vector<MenuEntry> items;
@@ -115,31 +125,20 @@ std::optional<EventEntry> Catalogue::entry(EventKind kind, int code) {
 }
 
 std::u16string Catalogue::displayText(EventKind kind, int code, int capacity) {
-    std::string name = exportName(kind, "String");
-    TextBuffer buffer(name, capacity);
-    module_.entry<StringFn>(name.c_str())(editor_.structure(), code, buffer.data(), capacity);
-    return buffer.text();
+    return textFrom<StringFn>(module_, editor_, exportName(kind, "String"), capacity, code);
 }
 
+// An expression has one title, which takes no index.
 std::u16string Catalogue::title(EventKind kind, int code, int index, int capacity) {
-    if (kind == EventKind::Expression) {
-        if (index != 0) return std::u16string();
-        TextBuffer buffer("GetExpressionTitle", capacity);
-        module_.entry<ExpressionTitleFn>("GetExpressionTitle")(editor_.structure(), code,
-                                                               buffer.data(), capacity);
-        return buffer.text();
-    }
     std::string name = exportName(kind, "Title");
-    TextBuffer buffer(name, capacity);
-    module_.entry<TitleFn>(name.c_str())(editor_.structure(), code, index, buffer.data(), capacity);
-    return buffer.text();
+    if (kind != EventKind::Expression)
+        return textFrom<TitleFn>(module_, editor_, name, capacity, code, index);
+    if (index != 0) return std::u16string();
+    return textFrom<ExpressionTitleFn>(module_, editor_, "GetExpressionTitle", capacity, code);
 }
 
 std::u16string Catalogue::expressionParam(int code, int index, int capacity) {
-    TextBuffer buffer("GetExpressionParam", capacity);
-    module_.entry<TitleFn>("GetExpressionParam")(editor_.structure(), code, index, buffer.data(),
-                                                 capacity);
-    return buffer.text();
+    return textFrom<TitleFn>(module_, editor_, "GetExpressionParam", capacity, code, index);
 }
 
 std::vector<std::u16string> Catalogue::identity() {

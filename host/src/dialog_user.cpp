@@ -21,29 +21,17 @@ thread_local User* activeUser = nullptr;
 // The tick period, in milliseconds: a user that needs a few ticks finishes in well under a second.
 const UINT TickPeriod = 10;
 
-std::u16string windowText(HWND window) {
+// A window's text or class name, as `get` (GetWindowTextW or GetClassNameW) gives it.
+std::u16string textOf(HWND window, int(WINAPI* get)(HWND, LPWSTR, int) = GetWindowTextW) {
     WCHAR buffer[256] = {};
-    int n = GetWindowTextW(window, buffer, 256);
-    return std::u16string(reinterpret_cast<const char16_t*>(buffer), n > 0 ? n : 0);
-}
-
-std::u16string className(HWND window) {
-    WCHAR buffer[64] = {};
-    int n = GetClassNameW(window, buffer, 64);
+    int n = get(window, buffer, 256);
     return std::u16string(reinterpret_cast<const char16_t*>(buffer), n > 0 ? n : 0);
 }
 
 BOOL CALLBACK findDialog(HWND window, LPARAM found) {
-    if (className(window) != u"#32770") return TRUE;
+    if (textOf(window, GetClassNameW) != u"#32770") return TRUE;
     *reinterpret_cast<HWND*>(found) = window;
     return FALSE;
-}
-
-// The thread's dialog on top, or null.
-HWND threadDialog() {
-    HWND found = nullptr;
-    EnumThreadWindows(GetCurrentThreadId(), findDialog, reinterpret_cast<LPARAM>(&found));
-    return found;
 }
 
 std::vector<std::u16string> listItems(HWND list) {
@@ -86,8 +74,8 @@ void clickItem(HWND dialog, int listId, int index, bool twice) {
 void look(User& user, HWND dialog) {
     DialogSeen& seen = user.seen;
     seen.appeared = true;
-    seen.caption = windowText(dialog);
-    seen.className = className(dialog);
+    seen.caption = textOf(dialog);
+    seen.className = textOf(dialog, GetClassNameW);
     if (HWND list = GetDlgItem(dialog, user.listId)) {
         seen.items = listItems(list);
         seen.initialSelection = static_cast<int>(SendMessageW(list, LB_GETCURSEL, 0, 0));
@@ -113,7 +101,9 @@ void perform(User& user, HWND dialog, const UserStep& step) {
 
 // One look or one step per tick.
 void CALLBACK onTick(HWND, UINT, UINT_PTR, DWORD) {
-    HWND dialog = activeUser ? threadDialog() : nullptr;
+    HWND dialog = nullptr;  // the thread's dialog on top
+    if (activeUser)
+        EnumThreadWindows(GetCurrentThreadId(), findDialog, reinterpret_cast<LPARAM>(&dialog));
     if (!dialog) return;
     User& user = *activeUser;
     DialogSeen& seen = user.seen;

@@ -6,7 +6,7 @@
 namespace hv {
 
 Guarded::Guarded(std::string name, size_t size, uint8_t content, size_t guard)
-    : name_(std::move(name)), size_(size), guard_(guard), bytes_(size + 2 * guard, fill::guard) {
+    : name_(std::move(name)), size_(size), guard_(guard), bytes_(size + 2 * guard, Fill::Guard) {
     std::memset(data(), content, size_);
 }
 
@@ -35,8 +35,8 @@ std::string Guarded::damage() const {
     long index = -1;
     if (!sealed_.empty()) {
         index = firstDifference(bytes_.data(), sealed_.data(), bytes_.size());
-    } else if ((index = firstNotPattern(bytes_.data(), fill::guard, guard_)) < 0) {
-        long after = firstNotPattern(data() + size_, fill::guard, guard_);
+    } else if ((index = firstNotPattern(bytes_.data(), Fill::Guard, guard_)) < 0) {
+        long after = firstNotPattern(data() + size_, Fill::Guard, guard_);
         if (after >= 0) index = static_cast<long>(guard_ + size_) + after;
     }
     return index < 0 ? std::string() : name_ + ": " + where(index);

@@ -13,8 +13,8 @@ namespace hv {
 
 class Guarded {
 public:
-    // `guard` bytes of fill::guard before and after the block.
-    Guarded(std::string name, size_t size, uint8_t content, size_t guard = fill::guardSize);
+    // `guard` bytes of Fill::Guard before and after the block.
+    Guarded(std::string name, size_t size, uint8_t content, size_t guard = Fill::GuardSize);
     uint8_t* data() { return bytes_.data() + guard_; }
     const uint8_t* data() const { return bytes_.data() + guard_; }
     size_t size() const { return size_; }

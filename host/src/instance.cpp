@@ -36,16 +36,11 @@ Instance* running = nullptr;
 // A text of at most `limit` UTF-16 units at an address that may be unaligned; `terminated` tells
 // whether a zero ended it.
 std::u16string readText(const uint8_t* p, size_t limit, bool* terminated) {
-    std::u16string text;
-    *terminated = false;
-    for (size_t i = 0; i < limit; ++i) {
-        char16_t unit = readAt<char16_t>(p, 2 * i);
-        if (unit == 0) {
-            *terminated = true;
-            break;
-        }
-        text += unit;
-    }
+    size_t n = 0;
+    while (n < limit && readAt<char16_t>(p, 2 * n)) ++n;
+    *terminated = n < limit;
+    std::u16string text(n, u'\0');
+    std::memcpy(&text[0], p, 2 * n);
     return text;
 }
 
@@ -107,7 +102,7 @@ struct Services {
         if (self->lendNoBuffer_) return nullptr;
         std::string name = "lent buffer " + std::to_string(e.buffers.size() + 1) + " (" +
                            std::to_string(bytes) + " bytes)";
-        e.buffers.emplace_back(name, static_cast<size_t>(bytes), fill::buffer);
+        e.buffers.emplace_back(name, static_cast<size_t>(bytes), Fill::Buffer);
         return reinterpret_cast<LPWSTR>(e.buffers.back().data());
     }
 
@@ -158,13 +153,13 @@ Instance::Instance(Module& module) : module_(module) {
     // An instance that could not be destroyed is refused before it is created.
     module.entry<DestroyEntry>("DestroyRunObject");
     recordSize_ = static_cast<uint16_t>(dataSize(0, 0));
-    if (recordSize_ < hostLayout.headerSize)
+    if (recordSize_ < BuildLayout.headerSize)
         throw std::runtime_error("GetRunObjectDataSize gave " + std::to_string(recordSize_) +
                                  " bytes, less than the host's own header");
     // The accessors read the module's fields at their offsets even if the module asked for
     // too little: those bytes then lie in the guard, inside the allocation.
-    size_t guard = fill::guardSize + std::max(recordSize_, hostLayout.recordSize) - recordSize_;
-    block_ = std::make_unique<Guarded>("record", recordSize_, fill::record, guard);
+    size_t guard = Fill::GuardSize + std::max(recordSize_, BuildLayout.recordSize) - recordSize_;
+    block_ = std::make_unique<Guarded>("record", recordSize_, Fill::Record, guard);
     record_ = block_->data();
     layOutHeader();
     liveRecords()[record_] = this;
@@ -179,8 +174,8 @@ Instance::~Instance() {
 
 // Bytes 0 to 7 of the header hold the owning instance; byte 8 the run header.
 void Instance::layOutHeader() {
-    const HostLayout& l = hostLayout;
-    runHeader_.assign(l.runHeaderSize, fill::runHeader);
+    const HostLayout& l = BuildLayout;
+    runHeader_.assign(l.runHeaderSize, Fill::RunHeader);
     writeAt(runHeader_.data(), l.getStringBuffer, &Services::getStringBuffer);
     writeAt(runHeader_.data(), l.getFirstExpressionParameter, &Services::firstExpressionParameter);
     writeAt(runHeader_.data(), l.getNextExpressionParameter, &Services::nextExpressionParameter);
@@ -188,18 +183,6 @@ void Instance::layOutHeader() {
     runHeaderSealed_ = runHeader_;
     writeAt(record_, 0, this);
     writeAt(record_, l.runHeader, static_cast<void*>(runHeader_.data()));
-}
-
-Outcome Instance::condition(int code, const std::vector<Param>& params) {
-    return run(EventKind::Condition, code, params);
-}
-
-Outcome Instance::action(int code, const std::vector<Param>& params) {
-    return run(EventKind::Action, code, params);
-}
-
-Outcome Instance::expression(int code, const std::vector<Param>& params) {
-    return run(EventKind::Expression, code, params);
 }
 
 Outcome Instance::run(EventKind kind, int code, const std::vector<Param>& params) {
@@ -226,7 +209,7 @@ void Instance::beginEvent(EventKind kind, const std::vector<Param>& params, Outc
     for (const Param& p : params) e.values.push_back(prepareParameter(p));
     // A flag left from an earlier event must not pass for this one's.
     setHeaderFlags(headerFlags() & ~StringResultFlag);
-    e.headerBefore.assign(record_, record_ + hostLayout.headerSize);
+    e.headerBefore.assign(record_, record_ + BuildLayout.headerSize);
 }
 
 // From now on the event's blocks are the host's: any later write into them is damage.
@@ -325,10 +308,12 @@ size_t Instance::locateText(const uint8_t* p, Outcome& outcome) const {
     return LongestText;
 }
 
-// Every block the module could have written where it must not, this event's and the last one's.
+// Every block the module could have written where it must not, this event's and the last one's:
+// the guards around the record first, then the header bytes the module must leave alone.
 void Instance::checkSentinels(Outcome& outcome) {
     std::vector<std::string> damage;
-    std::string record = damageToRecord();
+    std::string record = block_->damage();
+    if (record.empty()) record = damageToHeader();
     if (!record.empty()) damage.push_back(record);
     long changed = firstDifference(runHeader_.data(), runHeaderSealed_.data(), runHeader_.size());
     if (changed >= 0)
@@ -344,17 +329,11 @@ void Instance::checkSentinels(Outcome& outcome) {
     for (const std::string& d : damage) outcome.damage += (outcome.damage.empty() ? "" : "; ") + d;
 }
 
-// The guards around the record, the header bytes the module must leave alone, and the header
-// flags, of which the module may only set StringResultFlag.
-std::string Instance::damageToRecord() const {
-    std::string damage = block_->damage();
-    return damage.empty() ? damageToHeader() : damage;
-}
-
-// Header bytes compared with their state before the event; flags may only gain bits.
+// Header bytes compared with their state before the event; of the header flags, the module may
+// only set StringResultFlag.
 std::string Instance::damageToHeader() const {
     const std::vector<uint8_t>& was = event_->headerBefore;
-    size_t flags = hostLayout.headerFlags, rest = flags + sizeof(uint16_t);
+    size_t flags = BuildLayout.headerFlags, rest = flags + sizeof(uint16_t);
     long changed = firstDifference(record_, was.data(), flags);
     if (changed < 0) {
         changed = firstDifference(record_ + rest, was.data() + rest, was.size() - rest);

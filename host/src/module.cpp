@@ -33,8 +33,11 @@ std::string describeError(DWORD code) {
     return text.empty() ? number : text + " (" + number + ")";
 }
 
-// The entries of a routine table up to `count`, and whether a null entry ends it.
-std::vector<Slot> readTable(Slot address, uint16_t count, bool* ended) {
+// The entries of the routine table whose address and count the block holds at these offsets,
+// and whether a null entry ends it.
+std::vector<Slot> readTable(const uint8_t* block, size_t at, size_t countAt, bool* ended) {
+    auto address = readAt<Slot>(block, at);
+    auto count = readAt<uint16_t>(block, countAt);
     std::vector<Slot> entries;
     *ended = false;
     if (!address) return entries;
@@ -94,9 +97,9 @@ FARPROC Module::require(const char* name) const {
 // Hands the module a block filled with a pattern, with guard bytes after it, so that bytes it
 // must leave alone can be told from the ones it wrote.
 bool Module::readTables(std::string* error) {
-    const HostLayout& l = hostLayout;
+    const HostLayout& l = BuildLayout;
     size_t blockSize = alignUp(l.infoSize, l.pointerSize);
-    tables_.block.assign(blockSize + fill::guardSize, fill::infos);
+    tables_.block.assign(blockSize + Fill::GuardSize, Fill::Infos);
     try {
         auto infos = entry<GetRunObjectInfosEntry>("GetRunObjectInfos");
         tables_.infosResult = infos(0, tables_.block.data());
@@ -104,20 +107,16 @@ bool Module::readTables(std::string* error) {
         *error = e.what();
         return false;
     }
-    if (firstNotPattern(tables_.block.data() + blockSize, fill::infos, fill::guardSize) >= 0) {
+    if (firstNotPattern(tables_.block.data() + blockSize, Fill::Infos, Fill::GuardSize) >= 0) {
         *error = "GetRunObjectInfos wrote past the end of the RunObjectInfos block";
         return false;
     }
     const uint8_t* b = tables_.block.data();
-    tables_.conditionCount = readAt<uint16_t>(b, l.infoConditionCount);
-    tables_.actionCount = readAt<uint16_t>(b, l.infoActionCount);
-    tables_.expressionCount = readAt<uint16_t>(b, l.infoExpressionCount);
-    tables_.conditions = readTable(readAt<Slot>(b, l.infoConditions), tables_.conditionCount,
-                                   &tables_.conditionsEnd);
-    tables_.actions =
-        readTable(readAt<Slot>(b, l.infoActions), tables_.actionCount, &tables_.actionsEnd);
-    tables_.expressions = readTable(readAt<Slot>(b, l.infoExpressions), tables_.expressionCount,
-                                    &tables_.expressionsEnd);
+    tables_.conditions =
+        readTable(b, l.infoConditions, l.infoConditionCount, &tables_.conditionsEnd);
+    tables_.actions = readTable(b, l.infoActions, l.infoActionCount, &tables_.actionsEnd);
+    tables_.expressions =
+        readTable(b, l.infoExpressions, l.infoExpressionCount, &tables_.expressionsEnd);
     return true;
 }
 

@@ -1,11 +1,31 @@
-// The commands of the script language by their first word, and the events and simple commands:
-// how each line is read and what running it does.
+// The commands of the script language by their first word, and the events, the simple commands
+// and the state lines (saving an instance's state to a file, loading a state file into it, and
+// writing and checking the bytes of a file): how each line is read and what running it does.
 #include <hivelet/catalogue.h>
+
+#include <fstream>
+#include <iterator>
 
 #include "internal.h"
 #include "script_internal.h"
 
 namespace hv::script {
+
+// save "FILE" / load "FILE": one quoted file name.
+StateFile parseStateFile(Operands& in, bool save) {
+    std::string usage = std::string(save ? "save" : "load") + " needs a file name in quotes";
+    if (in.left() != 1) refuse(usage);
+    return StateFile{save, toUtf8(in.text(usage))};
+}
+
+// file "FILE" "hex" and expect file "FILE" "hex": the file's whole content.
+FileBytes parseFileBytes(Operands& in, bool check) {
+    std::string usage = std::string(check ? "expect file" : "file") +
+                        " needs a file name and hex bytes, both in quotes";
+    if (in.left() != 2 || !in.peek(1)->quoted) refuse(usage);
+    std::string path = toUtf8(in.text(usage));
+    return FileBytes{check, path, parseHex(in.text(usage))};
+}
 
 namespace {
 
@@ -50,20 +70,11 @@ Command parseShow(Operands& in) {
     refuse("show takes cnd, act or exp, a routine name and its parameters");
 }
 
-// For commands without operands.
-void nothingAfter(const Operands& in, const std::string& command) {
-    if (in.left() && in.peek()->quoted) refuse(command + " takes nothing after it");
+// A command without operands.
+template <typename Line>
+Command parseBare(Operands& in) {
     in.end();
-}
-
-Command parseNew(Operands& in) {
-    nothingAfter(in, "new");
-    return New{};
-}
-
-Command parseDebug(Operands& in) {
-    nothingAfter(in, "debug");
-    return Debug{};
+    return Line{};
 }
 
 // buffers on | off.
@@ -75,14 +86,13 @@ Command parseBuffers(Operands& in) {
 
 // poke FIELD INTEGER: the record fields a script may overwrite, as a loaded saved state could.
 Command parsePoke(Operands& in) {
-    const std::pair<const char*, size_t> fields[] = {{"rootKeyIndex", hostLayout.rootKeyIndex},
-                                                     {"lastError", hostLayout.lastError},
-                                                     {"use64BitView", hostLayout.use64BitView}};
+    const std::pair<const char*, size_t> fields[] = {{"rootKeyIndex", BuildLayout.rootKeyIndex},
+                                                     {"lastError", BuildLayout.lastError}};
     std::string field = in.word();
     Poke poke;
     for (auto [name, offset] : fields)
         if (field == name) poke.offset = offset;
-    if (!poke.offset) refuse("poke takes rootKeyIndex, lastError or use64BitView and an integer");
+    if (!poke.offset) refuse("poke takes rootKeyIndex or lastError and an integer");
     if (in.left() > 1 && !in.peek()->quoted) refuse("stray text after poke " + field);
     poke.value = static_cast<uint32_t>(in.integer("poke " + field + " needs an integer"));
     return poke;
@@ -93,7 +103,7 @@ const std::pair<const char*, Parser> Commands[] = {
     {"act", parseEventLine<EventKind::Action>},
     {"exp", parseEventLine<EventKind::Expression>},
     {"expect", parseExpect},
-    {"new", parseNew},
+    {"new", parseBare<New>},
     {"buffers", parseBuffers},
     {"poke", parsePoke},
     {"reg", parseRegistry},
@@ -102,7 +112,7 @@ const std::pair<const char*, Parser> Commands[] = {
     {"save", [](Operands& in) -> Command { return parseStateFile(in, true); }},
     {"load", [](Operands& in) -> Command { return parseStateFile(in, false); }},
     {"file", [](Operands& in) -> Command { return parseFileBytes(in, false); }},
-    {"debug", parseDebug},
+    {"debug", parseBare<Debug>},
     {"param", parseParam},
 };
 
@@ -136,9 +146,9 @@ Parser findCommand(const std::string& name) {
 // Runs an event line, shows it, and fails on damage or misuse whatever the script expects.
 void run(Session& session, const Step& step, const Event& line) {
     std::vector<Param> params = resolve(session, line.arguments);
-    size_t mark = session.layer ? journalMark() : 0;
+    size_t mark = journalMark();
     Outcome outcome = session.instance().run(line.kind, line.code, params);
-    if (session.layer) session.eventCalls = journalSince(mark);
+    session.eventCalls = {mark, journalMark()};
     ++session.events;
     session.show(step, "=> " + resultText(line.kind, outcome) + "   (lastError " +
                            std::to_string(session.instance().lastError()) + ")");
@@ -177,6 +187,38 @@ void run(Session& session, const Step& step, const Buffers& line) {
 void run(Session& session, const Step& step, const Poke& line) {
     writeAt(session.instance().record(), line.offset, line.value);
     session.show(step, "written");
+}
+
+// Runs SaveRunObject or LoadRunObject; its result becomes the last result, for `expect 1`.
+void run(Session& session, const Step& step, const StateFile& line) {
+    std::string error;
+    Instance& instance = session.instance();
+    int result =
+        line.save ? instance.saveState(line.path, &error) : instance.loadState(line.path, &error);
+    if (result < 0) refuse(error);
+    ++session.events;
+    session.show(step, "=> " + std::to_string(result) + "   (lastError " +
+                           std::to_string(instance.lastError()) + ")");
+    Outcome outcome;
+    outcome.raw = result;
+    session.remember(EventKind::Condition, std::move(outcome));
+}
+
+void run(Session& session, const Step& step, const FileBytes& line) {
+    if (line.check) {
+        std::ifstream in(line.path, std::ios::binary);
+        std::vector<uint8_t> bytes((std::istreambuf_iterator<char>(in)),
+                                   std::istreambuf_iterator<char>());
+        if (!in) refuse("cannot read " + line.path);
+        return session.checked(
+            step, unless(bytes == line.bytes, line.path + " to hold " + hexList(line.bytes),
+                         hexList(bytes)));
+    }
+    std::ofstream out(line.path, std::ios::binary | std::ios::trunc);
+    out.write(reinterpret_cast<const char*>(line.bytes.data()),
+              static_cast<std::streamsize>(line.bytes.size()));
+    if (!out) refuse("cannot write " + line.path);
+    session.show(step, "written: " + std::to_string(line.bytes.size()) + " bytes");
 }
 
 }  // namespace hv::script

@@ -16,10 +16,9 @@ int64_t oneInteger(Operands& in, const std::string& what, bool count) {
     return value;
 }
 
-// expect [result] VALUE: a text, true, false or an integer.
+// expect VALUE: a text, true, false or an integer.
 Command parseResult(Operands& in) {
     const Token* t = in.next();
-    if (!t) refuse("expect result needs a value");
     in.end();
     ExpectResult line;
     int64_t n = 0;
@@ -60,19 +59,13 @@ Command parseAddress(Operands& in) {
     refuse("expect address takes currentKey, buffer or elsewhere");
 }
 
-// expect currentKey "text" | null
-Command parseCurrentKey(Operands& in) {
+// expect currentKey "text" | null, expect sentence "text"
+Command parseText(Operands& in, bool sentence) {
     const Token* t = in.left() == 1 ? in.next() : nullptr;
-    if (!t || (!t->quoted && t->word != "null")) refuse("expect currentKey takes a text or null");
-    ExpectCurrentKey line;
-    if (t->quoted) line.key = t->text;
-    return line;
-}
-
-// expect sentence "text"
-Command parseSentence(Operands& in) {
-    if (in.left() != 1) refuse("expect sentence needs a text");
-    return ExpectSentence{in.text("expect sentence needs a text")};
+    if (!t || (!t->quoted && (sentence || t->word != "null")))
+        refuse(sentence ? "expect sentence needs a text"
+                        : "expect currentKey takes a text or null");
+    return ExpectText{sentence, t->quoted ? quote(t->text) : "null"};
 }
 
 // expect debug ITEM "text" | untouched
@@ -88,11 +81,10 @@ Command parseDebug(Operands& in) {
 }
 
 const std::pair<const char*, Parser> Subjects[] = {
-    {"result", parseResult},
     {"buffers", parseBuffers},
     {"address", parseAddress},
-    {"currentKey", parseCurrentKey},
-    {"sentence", parseSentence},
+    {"currentKey", [](Operands& in) { return parseText(in, false); }},
+    {"sentence", [](Operands& in) { return parseText(in, true); }},
     {"debug", parseDebug},
     {"file", [](Operands& in) -> Command { return parseFileBytes(in, true); }},
 };
@@ -118,54 +110,13 @@ std::string got(Session& s) {
 // Why the last event did not return exactly this text, or "".
 std::string textWhy(Session& s, const std::u16string& wanted, const std::string& what) {
     const Outcome& o = s.lastEvent();
-    return o.isText && o.text == wanted ? "" : "expected " + what + ", got " + got(s);
+    return unless(o.isText && o.text == wanted, what, got(s));
 }
 
 // A 32-bit field or count against the expected value.
 std::string numberWhy(const char* what, int64_t wanted, uint64_t actual) {
-    if (static_cast<uint64_t>(static_cast<uint32_t>(wanted)) == actual) return std::string();
-    return std::string("expected ") + what + " " + std::to_string(wanted) + ", got " +
-           std::to_string(actual);
-}
-
-// Integers compare at the width of the routine's result: 16 bits for actions, 32 otherwise.
-std::string resultWhy(Session& s, const ExpectResult& line) {
-    const Outcome& o = s.lastEvent();
-    if (auto* text = std::get_if<std::u16string>(&line.value))
-        return textWhy(s, *text, quote(*text));
-    if (auto* truth = std::get_if<bool>(&line.value)) {
-        if (s.lastKind() == EventKind::Condition && o.asCondition() == (*truth ? 1 : 0)) return "";
-        return std::string("expected ") + (*truth ? "true" : "false") + ", got " + got(s);
-    }
-    int64_t n = std::get<int64_t>(line.value);
-    auto wanted = static_cast<uint32_t>(n);
-    bool same = s.lastKind() == EventKind::Action
-                    ? static_cast<uint16_t>(o.asAction()) == static_cast<uint16_t>(wanted)
-                    : !o.isText && static_cast<uint32_t>(o.asInteger()) == wanted;
-    return same ? "" : "expected " + std::to_string(n) + ", got " + got(s);
-}
-
-// The system's message is asked for here, so the check holds for every system's texts.
-std::string fieldWhy(Session& s, const ExpectNumber& line) {
-    Instance& instance = s.instance();
-    switch (line.of) {
-        case ExpectNumber::Of::LastError:
-            return numberWhy("lastError", line.value, instance.lastError());
-        case ExpectNumber::Of::RootKeyIndex:
-            return numberWhy("rootKeyIndex", line.value, instance.rootKeyIndex());
-        case ExpectNumber::Of::Use64BitView:
-            return numberWhy("use64BitView", line.value, instance.use64BitView());
-        case ExpectNumber::Of::Fetches: {
-            const Outcome& o = s.lastEvent();
-            return numberWhy("parameter fetches", line.value,
-                             o.parameterFetches + o.expressionFetches);
-        }
-        default: break;
-    }
-    auto code = static_cast<uint32_t>(line.value);
-    std::u16string wanted = systemMessage(code);
-    return textWhy(s, wanted,
-                   "the system's message for " + std::to_string(code) + ", " + quote(wanted));
+    return unless(static_cast<uint64_t>(static_cast<uint32_t>(wanted)) == actual,
+                  what + (" " + std::to_string(wanted)), std::to_string(actual));
 }
 
 // Buffer sizes as "[1024 8]".
@@ -177,8 +128,8 @@ std::string listed(const std::vector<size_t>& sizes) {
 
 // Where a text result lies, as messages say it.
 const char* placePhrase(Outcome::TextSource place) {
-    static const char* const phrases[] = {"", "in a lent buffer", "in currentKey", "elsewhere"};
-    return phrases[static_cast<size_t>(place)];
+    static const char* const Phrases[] = {"", "in a lent buffer", "in currentKey", "elsewhere"};
+    return Phrases[static_cast<size_t>(place)];
 }
 
 // The debugger line as the transcript shows it: quoted, and whether the buffer was touched.
@@ -214,19 +165,51 @@ Command parseExpect(Operands& in) {
     return parseResult(in);
 }
 
+// Integers compare at the width of the routine's result: 16 bits for actions, 32 otherwise.
 void run(Session& s, const Step& step, const ExpectResult& line) {
-    s.checked(step, resultWhy(s, line));
+    const Outcome& o = s.lastEvent();
+    if (auto* text = std::get_if<std::u16string>(&line.value))
+        return s.checked(step, textWhy(s, *text, quote(*text)));
+    if (auto* truth = std::get_if<bool>(&line.value))
+        return s.checked(step, unless(s.lastKind() == EventKind::Condition &&
+                                          o.asCondition() == (*truth ? 1 : 0),
+                                      *truth ? "true" : "false", got(s)));
+    int64_t n = std::get<int64_t>(line.value);
+    auto wanted = static_cast<uint32_t>(n);
+    bool same = s.lastKind() == EventKind::Action
+                    ? static_cast<uint16_t>(o.asAction()) == static_cast<uint16_t>(wanted)
+                    : !o.isText && static_cast<uint32_t>(o.asInteger()) == wanted;
+    return s.checked(step, unless(same, std::to_string(n), got(s)));
 }
 
+// The system's message is asked for here, so the check holds for every system's texts.
 void run(Session& s, const Step& step, const ExpectNumber& line) {
-    s.checked(step, fieldWhy(s, line));
+    Instance& instance = s.instance();
+    switch (line.of) {
+        case ExpectNumber::Of::LastError:
+            return s.checked(step, numberWhy("lastError", line.value, instance.lastError()));
+        case ExpectNumber::Of::RootKeyIndex:
+            return s.checked(step, numberWhy("rootKeyIndex", line.value, instance.rootKeyIndex()));
+        case ExpectNumber::Of::Use64BitView:
+            return s.checked(step, numberWhy("use64BitView", line.value, instance.use64BitView()));
+        case ExpectNumber::Of::Fetches: {
+            const Outcome& o = s.lastEvent();
+            return s.checked(step, numberWhy("parameter fetches", line.value,
+                                             o.parameterFetches + o.expressionFetches));
+        }
+        default: break;
+    }
+    auto code = static_cast<uint32_t>(line.value);
+    std::u16string wanted = systemMessage(code);
+    return s.checked(
+        step, textWhy(s, wanted,
+                      "the system's message for " + std::to_string(code) + ", " + quote(wanted)));
 }
 
 void run(Session& s, const Step& step, const ExpectBuffers& line) {
     const std::vector<size_t>& asked = s.lastEvent().bufferRequests;
-    s.checked(step, asked == line.sizes ? ""
-                                        : "expected buffer requests " + listed(line.sizes) +
-                                              ", got " + listed(asked));
+    s.checked(step,
+              unless(asked == line.sizes, "buffer requests " + listed(line.sizes), listed(asked)));
 }
 
 void run(Session& s, const Step& step, const ExpectAddress& line) {
@@ -239,30 +222,21 @@ void run(Session& s, const Step& step, const ExpectAddress& line) {
     s.checked(step, why);
 }
 
-void run(Session& s, const Step& step, const ExpectCurrentKey& line) {
+void run(Session& s, const Step& step, const ExpectText& line) {
     const char16_t* key = s.instance().currentKey();
-    bool same = line.key ? key && *line.key == key : key == nullptr;
-    s.checked(step, same ? ""
-                         : "expected currentKey " + (line.key ? quote(*line.key) : "null") +
-                               ", got " + (key ? quote(key) : "null"));
-}
-
-void run(Session& s, const Step& step, const ExpectSentence& line) {
-    if (!s.sentence) refuse("expect sentence with no show line before it");
-    s.checked(step, *s.sentence == line.text ? ""
-                                             : "expected the sentence " + quote(line.text) +
-                                                   ", got " + quote(*s.sentence));
+    if (line.sentence && !s.sentence) refuse("expect sentence with no show line before it");
+    std::string actual = line.sentence ? quote(*s.sentence) : key ? quote(key) : "null";
+    s.checked(step,
+              unless(actual == line.wanted,
+                     (line.sentence ? "the sentence " : "currentKey ") + line.wanted, actual));
 }
 
 void run(Session& s, const Step& step, const ExpectDebug& line) {
     Instance::DebugLine shown = s.instance().debugLine(line.item);
     if (!shown.sentinelsIntact) refuse("GetDebugItem wrote past the 256-character line");
     bool same = line.text ? lineIs(shown, *line.text) : !shown.written;
-    s.checked(step, same ? ""
-                         : "expected the debugger line " +
-                               (line.text ? quote(*line.text) + " padded with zeros"
-                                          : "buffer untouched") +
-                               ", got " + shownLine(shown));
+    std::string wanted = line.text ? quote(*line.text) + " padded with zeros" : "buffer untouched";
+    s.checked(step, unless(same, "the debugger line " + wanted, shownLine(shown)));
 }
 
 // debug: both lines of the debugger.

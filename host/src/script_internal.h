@@ -26,6 +26,11 @@ inline void refuseIf(const std::string& error) {
     if (!error.empty()) refuse(error);
 }
 
+// Why an expectation does not hold: "" when it holds, else "expected WANTED, got GOT".
+inline std::string unless(bool holds, const std::string& wanted, const std::string& got) {
+    return holds ? std::string() : "expected " + wanted + ", got " + got;
+}
+
 // A token of a line: a quoted text (escapes resolved) or a bare word.
 struct Token {
     bool quoted = false;
@@ -43,13 +48,13 @@ public:
     explicit Operands(std::vector<Token> tokens) : tokens_(std::move(tokens)) {}
     size_t left() const { return tokens_.size() - at_; }
     // The operand `ahead` places on, or null past the end.
-    const Token* peek(size_t ahead = 0) const;
+    const Token* peek(size_t ahead = 0) const {
+        return at_ + ahead < tokens_.size() ? &tokens_[at_ + ahead] : nullptr;
+    }
     // Takes the next operand, or gives null at the end.
     const Token* next() { return at_ < tokens_.size() ? &tokens_[at_++] : nullptr; }
     // The next operand when it is a bare word, else "" (nothing is taken).
     std::string word();
-    // The next operand when it is a quoted text.
-    bool text(std::u16string& out);
     // The next operand, which must be a quoted text; else refuses with `usage`.
     std::u16string text(const std::string& usage);
     // The next operand, which must be a bare 32-bit integer; else refuses with `usage`.
@@ -91,19 +96,12 @@ Command parseExpect(Operands& in);
 Command parseRegistry(Operands& in);
 Command parseLayer(Operands& in);
 Command parseParam(Operands& in);
-StateFile parseStateFile(Operands& in, bool save);
 FileBytes parseFileBytes(Operands& in, bool check);
 // The parser of the command named `name`, or null.
 Parser findCommand(const std::string& name);
 // Whether `word`, after `layer`, starts a line of the layer's own (deny, fail ...); `next` is
 // the word after it.
 bool isLayerVerb(const std::string& word, const std::string& next);
-
-// A call the portable layer served during an event, from its journal.
-struct LayerCall {
-    std::string function;
-    std::vector<uint64_t> args;
-};
 
 // What a script's layer lines changed, so that it can be undone when the script ends.
 struct LayerChanges {
@@ -118,13 +116,10 @@ struct ParamState;
 // The state of one running script: its instance and the last event's outcome.
 class Session {
 public:
-    Session(Module& module, const std::string& file, std::ostream& out, std::ostream& err,
-            bool layer);
+    Session(Module& module, std::ostream& out, bool layer);
     Instance& instance() { return *instance_; }
     Module& module() { return module_; }
     void freshInstance();
-    // Reports a failure of `step` as "file:line: message".
-    void fail(const Step& step, const std::string& message);
     // Prints a transcript line for `step`.
     void show(const Step& step, const std::string& detail);
     // Shows a line that this build cannot run, with the reason.
@@ -144,14 +139,12 @@ public:
     unsigned expectations = 0;
     unsigned skipped = 0;
     const bool layer;                   // the portable layer's test control is there
-    std::vector<LayerCall> eventCalls;  // what the layer served during the last event
+    std::pair<size_t, size_t> eventCalls;  // the layer's journal entries of the last event
     std::optional<std::u16string> sentence;  // what the last `show` line printed
     LayerChanges layerChanges;
 
 private:
     Module& module_;
-    std::string file_;
-    std::ostream& err_;
     std::unique_ptr<Instance> instance_;
     std::optional<Outcome> last_;
     EventKind lastKind_ = EventKind::Condition;
@@ -169,13 +162,11 @@ void run(Session& s, const Step& step, const ExpectResult& line);
 void run(Session& s, const Step& step, const ExpectNumber& line);
 void run(Session& s, const Step& step, const ExpectBuffers& line);
 void run(Session& s, const Step& step, const ExpectAddress& line);
-void run(Session& s, const Step& step, const ExpectCurrentKey& line);
-void run(Session& s, const Step& step, const ExpectSentence& line);
+void run(Session& s, const Step& step, const ExpectText& line);
 void run(Session& s, const Step& step, const ExpectDebug& line);
 void run(Session& s, const Step& step, const Registry& line);
 void run(Session& s, const Step& step, const Deny& line);
 void run(Session& s, const Step& step, const Fail& line);
-void run(Session& s, const Step& step, const Clear& line);
 void run(Session& s, const Step& step, const Hide& line);
 void run(Session& s, const Step& step, const Version& line);
 void run(Session& s, const Step& step, const Handles& line);
@@ -189,9 +180,9 @@ void run(Session& s, const Step& step, const ParamEdit& line);
 void run(Session& s, const Step& step, const ParamString& line);
 void run(Session& s, const Step& step, const ParamExpect& line);
 
-// Marks where the layer's journal stands, and reads what it served since the mark.
+// Where the layer's journal stands (0 without the layer): the calls an event made lie between
+// the marks before and after it.
 size_t journalMark();
-std::vector<LayerCall> journalSince(size_t mark);
 // Undoes what the script's layer lines armed: faults, version settings, hidden exports, denials.
 void undoLayer(Session& session);
 

@@ -46,20 +46,17 @@ Command parseDeny(Operands& in) {
     return deny;
 }
 
-// layer fail FUNCTION NTH|always CODE
+// layer fail FUNCTION NTH CODE
 Command parseFail(Operands& in) {
-    const char* usage = "layer fail takes a function, which call (1 for the next, or always) "
-                        "and the code";
+    const char* usage = "layer fail takes a function, which call (1 for the next) and the code";
     if (in.left() < 3 || in.peek()->quoted || in.peek(1)->quoted) refuse(usage);
     Fail fail;
     fail.function = in.word();
     bool known = false;
     for (const char* f : FailableFunctions) known = known || fail.function == f;
     if (!known) refuse("the layer cannot fail '" + fail.function + "'");
-    std::string nth = in.word();
-    int64_t n = 0;
-    if (nth != "always") refuseIf(parseInteger(nth, n));
-    if (nth != "always" && n < 1) refuse("layer fail counts calls from 1");
+    int64_t n = in.integer(usage);
+    if (n < 1) refuse("layer fail counts calls from 1");
     fail.nth = static_cast<unsigned>(n);
     fail.code = static_cast<int32_t>(in.integer(usage));
     in.end();
@@ -83,9 +80,7 @@ Command parseVersion(Operands& in) {
     std::string how = in.word();
     if (how != "fail" && how != "normal" && how != "platform") refuse(usage);
     Version version;
-    version.how = how == "fail"     ? Version::How::Fail
-                  : how == "normal" ? Version::How::Normal
-                                    : Version::How::Platform;
+    version.fail = how == "fail";
     if (how == "platform") version.platform = static_cast<uint32_t>(in.integer(usage));
     in.end();
     return version;
@@ -124,7 +119,7 @@ Command parseLayerExpect(Operands& in) {
 
 bool isLayerVerb(const std::string& word, const std::string& next) {
     if (word == "expect") return next == "handles" || next == "calls";
-    for (const char* verb : {"deny", "fail", "hide", "unhide", "version", "clear"})
+    for (const char* verb : {"deny", "fail", "hide", "unhide", "version"})
         if (word == verb) return true;
     return false;
 }
@@ -134,15 +129,13 @@ Command parseLayer(Operands& in) {
     std::string verb = in.word();
     if (!isLayerVerb(verb, next && !next->quoted ? next->word : ""))
         refuse(
-            "layer needs a command, {, or one of: deny, fail, hide, unhide, version, clear, "
+            "layer needs a command, {, or one of: deny, fail, hide, unhide, version, "
             "expect handles, expect calls");
     if (verb == "deny") return parseDeny(in);
     if (verb == "fail") return parseFail(in);
     if (verb == "hide" || verb == "unhide") return parseHide(in, verb == "hide");
     if (verb == "version") return parseVersion(in);
-    if (verb == "expect") return parseLayerExpect(in);
-    in.end();
-    return Clear{};
+    return parseLayerExpect(in);
 }
 
 #ifndef _WIN32
@@ -154,17 +147,9 @@ void run(Session& session, const Step& step, const Deny& line) {
 }
 
 void run(Session& session, const Step& step, const Fail& line) {
-    if (line.nth)
-        w32test::failCall(line.function, line.nth, line.code);
-    else
-        w32test::failAlways(line.function, line.code);
+    w32test::failCall(line.function, line.nth, line.code);
     session.layerChanges.faults = true;
     session.show(step, "armed");
-}
-
-void run(Session& session, const Step& step, const Clear&) {
-    w32test::clearFaults();
-    session.show(step, "no call fails");
 }
 
 void run(Session& session, const Step& step, const Hide& line) {
@@ -174,37 +159,38 @@ void run(Session& session, const Step& step, const Hide& line) {
 }
 
 void run(Session& session, const Step& step, const Version& line) {
-    w32test::setVersionFault(line.how == Version::How::Fail);
-    if (line.how == Version::How::Normal) w32test::setPlatformId(VER_PLATFORM_WIN32_NT);
-    if (line.how == Version::How::Platform) w32test::setPlatformId(line.platform);
+    w32test::setVersionFault(line.fail);
+    if (!line.fail) w32test::setPlatformId(line.platform);
     session.layerChanges.version = true;
-    const char* const shown[] = {"GetVersionExW fails", "GetVersionExW answers as usual",
-                                 "GetVersionExW reports this platform"};
-    session.show(step, shown[static_cast<size_t>(line.how)]);
+    std::string platform = "GetVersionExW reports platform " + std::to_string(line.platform);
+    session.show(step, line.fail ? "GetVersionExW fails" : platform);
 }
 
 void run(Session& session, const Step& step, const Handles& line) {
     size_t open = w32test::openHandleCount();
-    session.checked(step, open == line.count
-                              ? ""
-                              : "expected " + std::to_string(line.count) +
-                                    " registry handles open, got " + std::to_string(open));
+    session.checked(step, unless(open == line.count,
+                                 std::to_string(line.count) + " registry handles open",
+                                 std::to_string(open)));
 }
 
 // Counts the calls of the last event, or checks that every one carried the mask.
 void run(Session& session, const Step& step, const Calls& line) {
     session.lastEvent();  // refuses when no event ran
+    const std::vector<w32test::Call>& journal = w32test::journal();
     std::vector<uint64_t> masks;
-    for (const LayerCall& c : session.eventCalls) {
+    for (size_t i = session.eventCalls.first; i < session.eventCalls.second; ++i) {
+        const w32test::Call& c = journal.at(i);
         if (c.function != line.function) continue;
         masks.push_back(0);
         for (auto [function, index] : MaskArguments)
             if (c.function == function && index < c.args.size()) masks.back() = c.args[index];
     }
     std::string why;
-    if (!line.mask && masks.size() != line.number)
-        why = "expected " + std::to_string(line.number) + " calls of " + line.function +
-              " in the last event, got " + std::to_string(masks.size());
+    if (!line.mask)
+        why = unless(masks.size() == line.number,
+                     std::to_string(line.number) + " calls of " + line.function +
+                         " in the last event",
+                     std::to_string(masks.size()));
     if (line.mask && masks.empty())
         why = "expected calls of " + line.function + ", the last event made none";
     for (size_t i = 0; line.mask && i < masks.size() && why.empty(); ++i)
@@ -223,18 +209,6 @@ size_t journalMark() {
 #else
     return 0;
 #endif
-}
-
-std::vector<LayerCall> journalSince(size_t mark) {
-    std::vector<LayerCall> calls;
-#ifndef _WIN32
-    const std::vector<w32test::Call>& journal = w32test::journal();
-    for (size_t i = mark; i < journal.size(); ++i)
-        calls.push_back(LayerCall{journal[i].function, journal[i].args});
-#else
-    (void)mark;
-#endif
-    return calls;
 }
 
 // Denials are lifted only from keys still there: lifting one from a deleted key would create it

@@ -23,7 +23,6 @@ void escape(const std::string& line, size_t& pos, std::u16string& text) {
         case '"': text += u'"'; break;
         case 'n': text += u'\n'; break;
         case 'r': text += u'\r'; break;
-        case 't': text += u'\t'; break;
         case 'u': {
             std::string digits = line.substr(pos + 1, 4);
             size_t valid = 0;
@@ -100,10 +99,6 @@ std::vector<Token> lex(const std::string& line, size_t pos, size_t* end) {
     return tokens;
 }
 
-const Token* Operands::peek(size_t ahead) const {
-    return at_ + ahead < tokens_.size() ? &tokens_[at_ + ahead] : nullptr;
-}
-
 std::string Operands::word() {
     const Token* t = peek();
     if (!t || t->quoted) return std::string();
@@ -111,18 +106,11 @@ std::string Operands::word() {
     return t->word;
 }
 
-bool Operands::text(std::u16string& out) {
-    const Token* t = peek();
-    if (!t || !t->quoted) return false;
-    out = t->text;
-    ++at_;
-    return true;
-}
-
 std::u16string Operands::text(const std::string& usage) {
-    std::u16string out;
-    if (!text(out)) refuse(usage);
-    return out;
+    const Token* t = peek();
+    if (!t || !t->quoted) refuse(usage);
+    ++at_;
+    return t->text;
 }
 
 int64_t Operands::integer(const std::string& usage) {
@@ -227,12 +215,12 @@ std::vector<uint8_t> parseHex(const std::u16string& text) {
 }
 
 std::string hexList(const std::vector<uint8_t>& bytes) {
-    static const char digits[] = "0123456789abcdef";
+    static const char Digits[] = "0123456789abcdef";
     std::string out;
     for (uint8_t b : bytes) {
         if (!out.empty()) out += ' ';
-        out += digits[b >> 4];
-        out += digits[b & 15];
+        out += Digits[b >> 4];
+        out += Digits[b & 15];
     }
     return "[" + out + "]";
 }
@@ -242,13 +230,13 @@ const char* rootKeyName(uint32_t index) {
 }
 
 HKEY rootKeyHandle(uint32_t index) {
-    static const HKEY roots[] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,
+    static const HKEY Roots[] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,
                                  HKEY_CURRENT_CONFIG, HKEY_USERS};
-    return roots[index];
+    return Roots[index];
 }
 
 std::string quote(const std::u16string& text) {
-    static const char digits[] = "0123456789abcdef";
+    static const char Digits[] = "0123456789abcdef";
     std::u16string out = u"\"";
     for (size_t i = 0; i < text.size(); ++i) {
         char16_t c = text[i];
@@ -259,12 +247,12 @@ std::string quote(const std::u16string& text) {
         } else if (c == u'\\' || c == u'"') {
             out += u'\\';
             out += c;
-        } else if (c == u'\n' || c == u'\r' || c == u'\t') {
-            out += c == u'\n' ? u"\\n" : c == u'\r' ? u"\\r" : u"\\t";
+        } else if (c == u'\n' || c == u'\r') {
+            out += c == u'\n' ? u"\\n" : u"\\r";
         } else if (c < 0x20 || c == 0x7F || (c >= 0xD800 && c <= 0xDFFF)) {
             out += u"\\u";
             for (int shift = 12; shift >= 0; shift -= 4)
-                out += static_cast<char16_t>(digits[(c >> shift) & 15]);
+                out += static_cast<char16_t>(Digits[(c >> shift) & 15]);
         } else {
             out += c;
         }

@@ -78,50 +78,6 @@ const std::pair<const char*, ParamExpect::What> ExpectWords[] = {
     {"bytes", ParamExpect::What::Bytes},         {"open", ParamExpect::What::Open},
     {"ranout", ParamExpect::What::RanOut},       {"untouched", ParamExpect::What::Untouched}};
 
-// The operands of `param expect WHAT`, by the kind of value WHAT takes.
-void parseExpectOperands(Operands& in, const std::string& what, ParamExpect& line) {
-    using What = ParamExpect::What;
-    size_t n = in.left();
-    switch (line.what) {
-        case What::Index:
-        case What::Result:
-        case What::Selection:
-            if (n != 1) refuse(ExpectUsage);
-            if (line.what == What::Selection && in.peek()->word == "none" && !in.peek()->quoted)
-                line.number = LB_ERR;
-            else
-                line.number = integerOperand(in.next());
-            return;
-        case What::Items:
-        case What::Caption:
-        case What::Text:
-        case What::Bytes:
-            if (n == 0 || (line.what != What::Items && n != 1)) refuse(ExpectUsage);
-            while (in.left()) line.texts.push_back(in.text(what + " takes texts in quotes"));
-            if (line.what == What::Bytes) line.bytes = parseHex(line.texts[0]);
-            return;
-        case What::Open:
-        case What::RanOut:
-            if (n == 0 || (line.what == What::RanOut && n != 1)) refuse(ExpectUsage);
-            for (std::string w; in.left(); line.flags.push_back(w == "yes"))
-                if (w = in.word(); w != "yes" && w != "no") refuse(what + " takes yes or no");
-            return;
-        default:
-            if (n) refuse(ExpectUsage);
-    }
-}
-
-Command parseExpectLine(Operands& in) {
-    std::string what = in.word();
-    auto known = std::find_if(std::begin(ExpectWords), std::end(ExpectWords),
-                              [&](const auto& w) { return what == w.first; });
-    if (known == std::end(ExpectWords)) refuse(ExpectUsage);
-    ParamExpect line;
-    line.what = known->second;
-    parseExpectOperands(in, what, line);
-    return line;
-}
-
 std::string whatWord(ParamExpect::What what) {
     for (auto [word, known] : ExpectWords)
         if (known == what) return word;
@@ -144,65 +100,67 @@ std::string selectionText(int64_t selection) {
     return selection == LB_ERR ? "none" : std::to_string(selection);
 }
 
-// "" when the two agree, else "expected WHAT WANTED, GOT SEEN".
-std::string compare(bool same, const std::string& what, const std::string& wanted,
-                    const std::string& got, const std::string& seen) {
-    return same ? std::string() : "expected " + what + wanted + ", " + got + " " + seen;
-}
-
-// Why the record, the dialog or the name copy is not as expected, or "".
-std::string why(const ParamExpect& line, const ParamState& s) {
+// param expect WHAT VALUE...: the value is kept as `shown` below writes what it checks, so that
+// one comparison serves every check.
+Command parseExpectLine(Operands& in) {
     using What = ParamExpect::What;
-    const DialogSeen& seen = s.seen;
-    const ParamEditor& param = s.param;
+    std::string what = in.word();
+    auto known = std::find_if(std::begin(ExpectWords), std::end(ExpectWords),
+                              [&](const auto& w) { return what == w.first; });
+    if (known == std::end(ExpectWords)) refuse(ExpectUsage);
+    ParamExpect line{known->second, "untouched"};
+    size_t n = in.left();
+    std::vector<std::u16string> list;
+    std::vector<bool> flags;
     switch (line.what) {
         case What::Index:
-            return compare(param.rootIndex() == static_cast<uint32_t>(line.number),
-                           "the record's index ",
-                           std::to_string(static_cast<uint32_t>(line.number)), "got",
-                           std::to_string(param.rootIndex()));
-        case What::Bytes:
-            return compare(param.recordBytes() == line.bytes, "the record ", hexList(line.bytes),
-                           "got", hexList(param.recordBytes()));
-        case What::Text:
-        case What::Untouched:
-            if (!s.copied)
-                return "param expect " + whatWord(line.what) +
-                       " needs a param string line before it";
-            if (line.what == What::Untouched)
-                return compare(s.text.untouched, "the buffer ", "untouched", "got",
-                               quote(s.text.text));
-            if (s.text.untouched)
-                return "expected " + quote(line.texts[0]) + ", the buffer was untouched";
-            return compare(s.text.text == line.texts[0], "", quote(line.texts[0]), "got",
-                           quote(s.text.text));
-        default: break;
-    }
-    if (!s.edited)
-        return "param expect " + whatWord(line.what) + " needs a param edit line before it";
-    switch (line.what) {
         case What::Result:
-            return compare(s.result == line.number, "the dialog's result ",
-                           std::to_string(line.number), "got", std::to_string(s.result));
         case What::Selection:
-            return compare(seen.initialSelection == line.number, "the initial selection ",
-                           selectionText(line.number), "saw", selectionText(seen.initialSelection));
-        case What::Caption:
-            return compare(seen.caption == line.texts[0], "the caption ", quote(line.texts[0]),
-                           "saw", quote(seen.caption));
+            if (n != 1) refuse(ExpectUsage);
+            if (line.what == What::Selection && !in.peek()->quoted && in.peek()->word == "none")
+                line.wanted = "none";
+            else if (int64_t number = integerOperand(in.next()); line.what == What::Index)
+                line.wanted = std::to_string(static_cast<uint32_t>(number));
+            else
+                line.wanted =
+                    line.what == What::Result ? std::to_string(number) : selectionText(number);
+            break;
         case What::Items:
-            return compare(seen.items == line.texts, "the items ", texts(line.texts), "saw",
-                           texts(seen.items));
+        case What::Caption:
+        case What::Text:
+        case What::Bytes:
+            if (n == 0 || (line.what != What::Items && n != 1)) refuse(ExpectUsage);
+            while (in.left()) list.push_back(in.text(what + " takes texts in quotes"));
+            line.wanted = line.what == What::Bytes ? hexList(parseHex(list[0])) : texts(list);
+            break;
         case What::Open:
-            return compare(seen.openAfter == line.flags,
-                           "open after each step: ", yesNo(line.flags), "got",
-                           yesNo(seen.openAfter));
+        case What::RanOut:
+            if (n == 0 || (line.what == What::RanOut && n != 1)) refuse(ExpectUsage);
+            for (std::string w; in.left(); flags.push_back(w == "yes"))
+                if (w = in.word(); w != "yes" && w != "no") refuse(what + " takes yes or no");
+            line.wanted = yesNo(flags);
+            break;
         default:
-            return seen.ranOut == line.flags[0]
-                       ? std::string()
-                       : std::string("expected the steps ") +
-                             (line.flags[0] ? "to run out" : "not to run out") + ", they did" +
-                             (seen.ranOut ? "" : " not");
+            if (n) refuse(ExpectUsage);
+    }
+    return line;
+}
+
+// What the record, the dialog or the name copy shows, as a param expect line writes it.
+std::string shown(ParamExpect::What what, const ParamState& s) {
+    using What = ParamExpect::What;
+    const DialogSeen& seen = s.seen;
+    switch (what) {
+        case What::Index: return std::to_string(s.param.rootIndex());
+        case What::Bytes: return hexList(s.param.recordBytes());
+        case What::Text:
+        case What::Untouched: return s.text.untouched ? "untouched" : quote(s.text.text);
+        case What::Result: return std::to_string(s.result);
+        case What::Selection: return selectionText(seen.initialSelection);
+        case What::Caption: return quote(seen.caption);
+        case What::Items: return texts(seen.items);
+        case What::Open: return yesNo(seen.openAfter);
+        default: return yesNo({seen.ranOut});
     }
 }
 
@@ -220,12 +178,9 @@ Command parseParam(Operands& in) {
     if (verb == "fill") return ParamRecord{true, static_cast<uint32_t>(integerOperand(in.peek()))};
     if (verb == "string") return ParamString{static_cast<Slot>(integerOperand(in.peek()))};
     Argument value = parseArgument(*in.peek());
-    Param::Kind kind = value.value.kind;
-    if (value.lastResult || (kind != Param::Kind::RootKey && kind != Param::Kind::Integer))
-        refuse("param record takes a root key name or an index");
-    return ParamRecord{false, kind == Param::Kind::RootKey
-                                  ? value.value.rootIndex
-                                  : static_cast<uint32_t>(value.value.integer)};
+    if (value.lastResult || value.value.kind != Param::Kind::RootKey)
+        refuse("param record takes a root key name or root:N");
+    return ParamRecord{false, value.value.rootIndex};
 }
 
 void run(Session& session, const Step& step, const ParamInit&) {
@@ -249,8 +204,8 @@ void run(Session& session, const Step& step, const ParamEdit& line) {
     s.result = s.param.edit(line.steps, &s.seen);
     s.edited = true;
     const DialogSeen& seen = s.seen;
-    std::string detail = "=> " + std::to_string(s.result) + "   (index " +
-                         std::to_string(s.param.rootIndex());
+    std::string detail =
+        "=> " + std::to_string(s.result) + "   (index " + std::to_string(s.param.rootIndex());
     if (seen.appeared)
         detail += "; saw " + quote(seen.caption) + ", " + std::to_string(seen.items.size()) +
                   " items, selection " + selectionText(seen.initialSelection) +
@@ -271,8 +226,20 @@ void run(Session& session, const Step& step, const ParamString& line) {
     if (!s.text.intact) refuse("sentinel hit: written past the capacity");
 }
 
+// The checks of the name copy need a param string line before them, those of the dialog a param
+// edit line; a text is checked as the name copy shows it, untouched or not.
 void run(Session& session, const Step& step, const ParamExpect& line) {
-    session.checked(step, why(line, session.param()));
+    using What = ParamExpect::What;
+    ParamState& s = session.param();
+    bool copy = line.what == What::Text || line.what == What::Untouched;
+    bool dialog = !copy && line.what != What::Index && line.what != What::Bytes;
+    if ((copy && !s.copied) || (dialog && !s.edited))
+        refuse("param expect " + whatWord(line.what) + " needs a param " +
+               (copy ? "string" : "edit") + " line before it");
+    std::string actual = shown(line.what, s);
+    session.checked(step,
+                    unless(actual == line.wanted,
+                           (copy ? "text" : whatWord(line.what)) + " " + line.wanted, actual));
 }
 
 }  // namespace hv::script

@@ -1,6 +1,6 @@
 // Registry lines: set-up and checks that go through the Win32 registry functions themselves, so
 // that one script runs alike against the portable layer and against a real registry.
-#include <cctype>
+#include <iterator>
 
 #include "internal.h"
 #include "script_internal.h"
@@ -54,17 +54,12 @@ void appendText(std::vector<uint8_t>& data, const std::u16string& text) {
     data.push_back(0);
 }
 
-// The type word of `bytes`: a name of TypeNames or a 32-bit number.
+// The type word of `bytes`: a name of TypeNames.
 uint32_t parseTypeWord(const std::string& word) {
     for (const TypeName& t : TypeNames)
         if (word == t.word) return t.type;
-    int64_t number = 0;
-    if (word.empty() || !std::isdigit(static_cast<unsigned char>(word[0])) ||
-        !parseInteger(word, number).empty())
-        refuse("unknown value type '" + word +
-               "' (none, sz, expand_sz, binary, dword, dword_be, link, multi_sz, qword or a "
-               "number)");
-    return static_cast<uint32_t>(number);
+    refuse("unknown value type '" + word +
+           "' (none, sz, expand_sz, binary, dword, dword_be, link, multi_sz or qword)");
 }
 
 // The data of a value: a type word and what that type takes. sz and expand_sz take one text,
@@ -73,10 +68,9 @@ uint32_t parseTypeWord(const std::string& word) {
 // writes.
 void parseData(Operands& in, Registry& reg) {
     std::string kind = in.word();
-    std::u16string text;
     if (kind == "multi_sz") {
         reg.type = REG_MULTI_SZ;
-        while (in.text(text)) appendText(reg.data, text);
+        while (in.left() && in.peek()->quoted) appendText(reg.data, in.next()->text);
         appendText(reg.data, u"");  // the empty text that ends the list
     } else if (kind == "sz" || kind == "expand_sz") {
         reg.type = kind == "sz" ? REG_SZ : REG_EXPAND_SZ;
@@ -106,19 +100,15 @@ void parseData(Operands& in, Registry& reg) {
 // The forms after `reg`: "key create", "value set", "expect key" ...
 Form parseForm(Operands& in) {
     std::string first = in.word();
-    if (first == "expect") {
-        std::string what = in.word();
-        if (what != "key" && what != "value") refuse("reg expect takes key or value");
-        return what == "key" ? Form::ExpectKey : Form::ExpectValue;
-    }
-    if (first != "key" && first != "value") refuse("reg takes key, value or expect");
-    std::string verb = in.word();
-    const char* verbs = first == "key" ? "create" : "set";
-    if (verb != verbs && verb != "delete")
-        refuse("reg " + first + " takes " + verbs + " or delete");
-    bool remove = verb == "delete";
-    return first == "key" ? (remove ? Form::DeleteKey : Form::CreateKey)
-                          : (remove ? Form::DeleteValue : Form::SetValue);
+    const char* seconds = first == "key"      ? "create or delete"
+                          : first == "value"  ? "set or delete"
+                          : first == "expect" ? "key or value"
+                                              : nullptr;
+    if (!seconds) refuse("reg takes key, value or expect");
+    std::string form = first + " " + in.word();
+    for (size_t i = 0; i < std::size(FormNames); ++i)
+        if (form == FormNames[i]) return static_cast<Form>(i);
+    refuse("reg " + first + " takes " + seconds);
 }
 
 // The key as messages name it: HKEY_CURRENT_USER "Software\\X" view64.
@@ -175,15 +165,19 @@ void createKey(Session& session, const Step& step, const Registry& reg) {
     session.show(step, disposition == REG_CREATED_NEW_KEY ? "created" : "was there");
 }
 
+// Whether the key is there: 0, 2 for a missing key, or another failure. It is opened asking for
+// no rights, so a key whose rights are denied still counts.
+LONG probe(const RegistryKey& key) {
+    HKEY handle = nullptr;
+    LONG result = openKey(key, 0, &handle);
+    if (result == ERROR_SUCCESS) RegCloseKey(handle);
+    return result;
+}
+
 void deleteKey(Session& session, const Step& step, const Registry& reg) {
-    HKEY key = nullptr;
-    LONG result = openKey(reg.key, 0, &key);
-    if (result == ERROR_FILE_NOT_FOUND) {
-        return session.show(step, "was not there");
-    }
-    if (result == ERROR_SUCCESS) RegCloseKey(key);
+    if (probe(reg.key) == ERROR_FILE_NOT_FOUND) return session.show(step, "was not there");
     const char* failed = "";
-    result = deleteTree(rootKeyHandle(reg.key.root), reg.key.path, reg.key.view, &failed);
+    LONG result = deleteTree(rootKeyHandle(reg.key.root), reg.key.path, reg.key.view, &failed);
     if (result != ERROR_SUCCESS) callFailed(reg, failed, result);
     session.show(step, "deleted");
 }
@@ -221,9 +215,7 @@ void deleteValue(Session& session, const Step& step, const Registry& reg) {
 
 // Why the key is not as expected, or "".
 std::string keyWhy(const Registry& reg) {
-    HKEY key = nullptr;
-    LONG result = openKey(reg.key, 0, &key);
-    if (result == ERROR_SUCCESS) RegCloseKey(key);
+    LONG result = probe(reg.key);
     if (result != ERROR_SUCCESS && result != ERROR_FILE_NOT_FOUND)
         return "cannot tell whether the key " + keyText(reg.key) + " exists: RegOpenKeyExW gave " +
                std::to_string(result);

@@ -1,8 +1,6 @@
 // Running scripts: one instance per script, a transcript line per step, and the first failure
 // reported as file:line: message.
-#include <fstream>
 #include <iomanip>
-#include <iterator>
 #include <stdexcept>
 #include <type_traits>
 
@@ -10,22 +8,16 @@
 
 namespace hv::script {
 
-Session::Session(Module& module, const std::string& file, std::ostream& output, std::ostream& err,
-                 bool withLayer)
-    : out(output), layer(withLayer), module_(module), file_(file), err_(err) {
+Session::Session(Module& module, std::ostream& output, bool withLayer)
+    : out(output), layer(withLayer), module_(module) {
     freshInstance();
 }
 
 void Session::freshInstance() {
     instance_.reset();
     last_.reset();
-    eventCalls.clear();
+    eventCalls = {0, 0};
     instance_ = std::make_unique<Instance>(module_);
-}
-
-void Session::fail(const Step& step, const std::string& message) {
-    out.flush();  // keeps the transcript before the message when both go to one terminal
-    err_ << file_ << ":" << step.line << ": " << message << std::endl;
 }
 
 void Session::show(const Step& step, const std::string& detail) {
@@ -65,7 +57,7 @@ const bool DefaultView32 = LayerBuilt || sizeof(void*) == 4;
 template <typename T>
 std::string layerSkipNote(const T&) {
     if constexpr (std::is_base_of_v<LayerControl, T>)
-        return std::string("needs the portable layer's ") + T::needs;
+        return std::string("needs the portable layer's ") + T::Needs;
     else
         return "holds only with the portable layer";
 }
@@ -82,21 +74,16 @@ void runLine(Session& session, const Step& step, const T& line) {
 
 }  // namespace
 
-Runner::Runner(Module& module, std::ostream& out, std::ostream& err)
-    : module_(module), out_(out), err_(err), layer_(LayerBuilt) {}
-
-void Runner::setLayer(bool present) {
-    layer_ = present && LayerBuilt;
-}
-
-bool Runner::run(const Script& script) {
-    out_ << "== " << script.file << '\n';
+bool runScript(Module& module, const Script& script, std::ostream& out, std::ostream& err,
+               bool layer) {
+    layer = layer && LayerBuilt;
+    out << "== " << script.file << '\n';
     std::unique_ptr<Session> session;
     try {
-        session = std::make_unique<Session>(module_, script.file, out_, err_, layer_);
+        session = std::make_unique<Session>(module, out, layer);
     } catch (const std::exception& e) {
-        out_.flush();
-        err_ << script.file << ": cannot create an instance: " << e.what() << std::endl;
+        out.flush();
+        err << script.file << ": cannot create an instance: " << e.what() << std::endl;
         return false;
     }
     for (const Step& step : script.steps) {
@@ -104,7 +91,7 @@ bool Runner::run(const Script& script) {
             session->skip(step, "in a 64-bit process: its default registry view is the 64-bit one");
             continue;
         }
-        if (step.layerOnly && !layer_) {
+        if (step.layerOnly && !layer) {
             std::string why =
                 std::visit([](const auto& l) { return layerSkipNote(l); }, step.command);
             session->skip(step, "under Windows: " + why);
@@ -113,36 +100,19 @@ bool Runner::run(const Script& script) {
         try {
             std::visit([&](const auto& l) { runLine(*session, step, l); }, step.command);
         } catch (const std::exception& e) {
-            session->fail(step, e.what());
+            out.flush();  // keeps the transcript before the message when both go to one terminal
+            err << script.file << ":" << step.line << ": " << e.what() << std::endl;
             undoLayer(*session);
-            out_ << "== " << script.file << ": FAILED at line " << step.line << "\n\n";
+            out << "== " << script.file << ": FAILED at line " << step.line << "\n\n";
             return false;
         }
     }
     undoLayer(*session);
-    out_ << "== " << script.file << ": passed (" << session->events << " events, "
-         << session->expectations << " expectations";
-    if (session->skipped) out_ << ", " << session->skipped << " lines skipped";
-    out_ << ")\n\n";
+    out << "== " << script.file << ": passed (" << session->events << " events, "
+        << session->expectations << " expectations";
+    if (session->skipped) out << ", " << session->skipped << " lines skipped";
+    out << ")\n\n";
     return true;
-}
-
-bool Runner::runFile(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
-    std::string text((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
-    if (!file || file.bad()) {
-        out_.flush();
-        err_ << path << ": cannot read the script" << std::endl;
-        return false;
-    }
-    ParseResult parsed = parse(path, text);
-    if (!parsed.ok()) {
-        out_ << "== " << path << ": not run\n\n";
-        out_.flush();
-        err_ << parsed.error << std::endl;
-        return false;
-    }
-    return run(parsed.script);
 }
 
 }  // namespace hv::script

@@ -1,11 +1,6 @@
 // The host's side of an instance's saved state and debugger lines, and the reader of state
 // files that hivelet-host dump-state uses.
 #include <algorithm>
-#include <atomic>
-#include <filesystem>
-#include <fstream>
-#include <iterator>
-#include <random>
 
 #include "internal.h"
 
@@ -37,15 +32,6 @@ int runState(Module& module, const char* entry, void* record, const std::string&
     return result;
 }
 
-// A fresh file name in the system's temporary folder; test programs run side by side, so the
-// name carries a random part besides the serial.
-std::string temporaryPath() {
-    static const unsigned process = std::random_device{}();
-    static std::atomic<unsigned> serial{0};
-    auto name = "hivelet-state-" + std::to_string(process) + "-" + std::to_string(++serial) + ".bin";
-    return (std::filesystem::temp_directory_path() / name).u8string();
-}
-
 uint32_t u32At(const std::vector<uint8_t>& b, size_t at) {
     return b[at] | b[at + 1] << 8 | b[at + 2] << 16 | static_cast<uint32_t>(b[at + 3]) << 24;
 }
@@ -60,35 +46,13 @@ int Instance::loadState(const std::string& path, std::string* error) {
     return runState(module_, "LoadRunObject", record_, path, false, error);
 }
 
-int Instance::saveState(std::vector<uint8_t>& bytes) {
-    std::string path = temporaryPath();
-    int result = saveState(path);
-    std::ifstream in(std::filesystem::u8path(path), std::ios::binary);
-    bytes.assign(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
-    in.close();
-    std::filesystem::remove(std::filesystem::u8path(path));
-    return result;
-}
-
-int Instance::loadState(const std::vector<uint8_t>& bytes) {
-    std::string path = temporaryPath();
-    {
-        std::ofstream out(std::filesystem::u8path(path), std::ios::binary);
-        out.write(reinterpret_cast<const char*>(bytes.data()),
-                  static_cast<std::streamsize>(bytes.size()));
-    }
-    int result = loadState(path);
-    std::filesystem::remove(std::filesystem::u8path(path));
-    return result;
-}
-
 std::u16string Instance::DebugLine::text() const {
     return std::u16string(buffer.begin(), std::find(buffer.begin(), buffer.end(), u'\0'));
 }
 
 Instance::DebugLine Instance::debugLine(int item) {
     auto get = module_.entry<DebugItemEntry>("GetDebugItem");
-    std::vector<char16_t> store(DebugLineChars + fill::guardSize, LineFill);
+    std::vector<char16_t> store(DebugLineChars + Fill::GuardSize, LineFill);
     get(reinterpret_cast<LPWSTR>(store.data()), record_, item);
     DebugLine line;
     line.buffer.assign(store.begin(), store.begin() + DebugLineChars);

@@ -38,23 +38,12 @@ char32_t decode(const std::string& s, size_t& i) {
     return c;
 }
 
-// Appends one code point as UTF-8.
+// Appends one code point as UTF-8: a lead byte, then six bits per continuation byte.
 void appendUtf8(std::string& out, char32_t c) {
-    if (c < 0x80) {
-        out += static_cast<char>(c);
-    } else if (c < 0x800) {
-        out += static_cast<char>(0xC0 | (c >> 6));
-        out += static_cast<char>(0x80 | (c & 0x3F));
-    } else if (c < 0x10000) {
-        out += static_cast<char>(0xE0 | (c >> 12));
-        out += static_cast<char>(0x80 | ((c >> 6) & 0x3F));
-        out += static_cast<char>(0x80 | (c & 0x3F));
-    } else {
-        out += static_cast<char>(0xF0 | (c >> 18));
-        out += static_cast<char>(0x80 | ((c >> 12) & 0x3F));
-        out += static_cast<char>(0x80 | ((c >> 6) & 0x3F));
-        out += static_cast<char>(0x80 | (c & 0x3F));
-    }
+    static const unsigned char Leads[] = {0, 0xC0, 0xE0, 0xF0};
+    int more = c < 0x80 ? 0 : c < 0x800 ? 1 : c < 0x10000 ? 2 : 3;
+    out += static_cast<char>(Leads[more] | (c >> (6 * more)));
+    for (int k = more - 1; k >= 0; --k) out += static_cast<char>(0x80 | ((c >> (6 * k)) & 0x3F));
 }
 
 }  // namespace
@@ -112,10 +101,10 @@ long firstNotPattern(const uint8_t* data, uint8_t pattern, size_t size) {
 
 // A number in hex, for messages.
 std::string hex(uint64_t value) {
-    static const char digits[] = "0123456789ABCDEF";
+    static const char Digits[] = "0123456789ABCDEF";
     std::string out;
     do {
-        out.insert(out.begin(), digits[value & 15]);
+        out.insert(out.begin(), Digits[value & 15]);
         value >>= 4;
     } while (value);
     return "0x" + out;

@@ -33,9 +33,9 @@ TEST(HostModule, ReadsTheTablesFromABlockItPrefilled) {
     EXPECT_EQ(t.expressions.size(), 8u);
     EXPECT_TRUE(t.conditionsEnd && t.actionsEnd && t.expressionsEnd);
     // The stand-in writes only the pointers and counts: everything else keeps the host's fill.
-    EXPECT_EQ(t.block[hv::hostLayout.infoHostByte], hv::fill::infos);
-    EXPECT_EQ(t.block[hv::hostLayout.infoIdentifier], hv::fill::infos);
-    EXPECT_EQ(t.block.back(), hv::fill::infos);
+    EXPECT_EQ(t.block[hv::BuildLayout.infoHostByte], hv::Fill::Infos);
+    EXPECT_EQ(t.block[hv::BuildLayout.infoIdentifier], hv::Fill::Infos);
+    EXPECT_EQ(t.block.back(), hv::Fill::Infos);
 }
 
 TEST(HostModule, LoadFailuresNameTheirCause) {
@@ -57,7 +57,7 @@ TEST(HostModule, LoadFailuresNameTheirCause) {
 // guard bytes after the record's last byte.
 TEST(HostInstance, LaysOutTheRecordAndRunHeader) {
     hv::Instance instance(fake());
-    const hv::HostLayout& l = hv::hostLayout;
+    const hv::HostLayout& l = hv::BuildLayout;
     ASSERT_EQ(instance.recordSize(), l.recordSize);
     uint8_t* runHeader;
     std::memcpy(&runHeader, instance.record() + l.runHeader, sizeof runHeader);
@@ -67,10 +67,10 @@ TEST(HostInstance, LaysOutTheRecordAndRunHeader) {
         std::memcpy(&service, runHeader + offset, sizeof service);
         EXPECT_NE(service, nullptr) << "service at " << offset;
     }
-    EXPECT_EQ(runHeader[0], hv::fill::runHeader);
-    EXPECT_EQ(runHeader[l.getNextParameter - 1], hv::fill::runHeader);
-    EXPECT_EQ(instance.record()[100], hv::fill::record);
-    EXPECT_EQ(instance.record()[l.recordSize], hv::fill::guard);
+    EXPECT_EQ(runHeader[0], hv::Fill::RunHeader);
+    EXPECT_EQ(runHeader[l.getNextParameter - 1], hv::Fill::RunHeader);
+    EXPECT_EQ(instance.record()[100], hv::Fill::Record);
+    EXPECT_EQ(instance.record()[l.recordSize], hv::Fill::Guard);
 }
 
 TEST(HostInstance, PassesParametersAsTheRoutinesArguments) {
@@ -115,7 +115,7 @@ const EventKind Cnd = EventKind::Condition, Act = EventKind::Action, Exp = Event
 
 // One row per routine of the stand-in: the damage or the misuse it commits.
 std::vector<Fault> faults() {
-    std::string n = std::to_string(hv::hostLayout.recordSize);
+    std::string n = std::to_string(hv::BuildLayout.recordSize);
     std::string tail = "record: byte " + n + ", past its " + n + " bytes, was written";
     std::string overFetch = "fetched parameter 2 of an event with 1";
     std::vector<Param> text{Param::str(u"a")}, null{Param::null()};
@@ -203,7 +203,7 @@ TEST(HostInstance, UnknownRoutineCodeThrows) {
 TEST(HostEditor, ServicesAtTheirOffsets) {
     typedef DWORD(WINAPI * Version)();
     typedef void(WINAPI * Insert)(hv::Slot, int, const void*, int, int);
-    const hv::HostLayout& l = hv::hostLayout;
+    const hv::HostLayout& l = hv::BuildLayout;
     hv::Editor first, second;
     first.setHostVersion(0x1111);
     second.setHostVersion(0x2222);

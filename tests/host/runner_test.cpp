@@ -28,8 +28,7 @@ Ran run(const std::string& text, hv::Module& module = hivelet()) {
     hv::script::ParseResult parsed = hv::script::parse("t.hvs", text);
     EXPECT_TRUE(parsed.ok()) << parsed.error;
     std::ostringstream out, err;
-    hv::script::Runner runner(module, out, err);
-    bool passed = runner.run(parsed.script);
+    bool passed = hv::script::runScript(module, parsed.script, out, err);
     return {passed, out.str(), err.str()};
 }
 
@@ -38,9 +37,7 @@ Ran runWithoutLayer(const std::string& text) {
     hv::script::ParseResult parsed = hv::script::parse("t.hvs", text);
     EXPECT_TRUE(parsed.ok()) << parsed.error;
     std::ostringstream out, err;
-    hv::script::Runner runner(hivelet(), out, err);
-    runner.setLayer(false);
-    bool passed = runner.run(parsed.script);
+    bool passed = hv::script::runScript(hivelet(), parsed.script, out, err, false);
     return {passed, out.str(), err.str()};
 }
 
@@ -192,8 +189,8 @@ TEST(ScriptRunner, RegistryMismatchesNameBothSides) {
              " to be REG_DWORD [01 00], found REG_DWORD [01 00 00 00]"},
         {"reg expect value " + at("") + " \"D\" missing",
          "expected the value \"D\" of " + key + " to be none, found REG_DWORD [01 00 00 00]"},
-        {"reg expect value " + at("") + " \"E\" bytes 12345 \"\"",
-         "expected the value \"E\" of " + key + " to be type 12345 [], found no value"},
+        {"reg expect value " + at("") + " \"E\" bytes link \"\"",
+         "expected the value \"E\" of " + key + " to be REG_LINK [], found no value"},
         {"reg expect value " + at("\\\\None") + " \"D\" qword 1",
          "expected the value \"D\" of " + at("\\\\None") +
              " to be REG_QWORD [01 00 00 00 00 00 00 00], found no key"},
@@ -216,7 +213,6 @@ TEST(ScriptRunner, LayerLinesAreSkippedWithANote) {
         "layer fail RegOpenKeyExW 1 5\n"
         "layer hide RegDeleteKeyExW\n"
         "layer version fail\n"
-        "layer clear\n"
         "layer expect handles 3\n"
         "layer expect calls RegOpenKeyExW 9\n"
         "layer act ActSetRootKey root:9\n"
@@ -236,16 +232,15 @@ TEST(ScriptRunner, LayerLinesAreSkippedWithANote) {
         "exports",
         "layer version fail   skipped under Windows: needs the portable layer's GetVersionExW "
         "settings",
-        "layer clear   skipped under Windows: needs the portable layer's fault injection",
         "layer expect handles 3   skipped under Windows: needs the portable layer's handle count",
         "layer expect calls RegOpenKeyExW 9   skipped under Windows: needs the portable layer's "
         "call journal",
-        "   8  layer act ActSetRootKey root:9   skipped under Windows: holds only with the portable "
+        "   7  layer act ActSetRootKey root:9   skipped under Windows: holds only with the portable "
         "layer",
-        "  10    expect error 7   skipped under Windows: holds only with the portable layer",
+        "   9    expect error 7   skipped under Windows: holds only with the portable layer",
         "reg expect key missing HKEY_CURRENT_USER \"Software\"   skipped under Windows: holds only "
         "with the portable layer",
-        "passed (1 events, 1 expectations, 10 lines skipped)",
+        "passed (1 events, 1 expectations, 9 lines skipped)",
     };
     for (const char* line : lines) EXPECT_TRUE(contains(r.out, line)) << line << "\n" << r.out;
 }
@@ -290,7 +285,7 @@ TEST(ScriptRunner, LayerLinesDriveThePortableLayer) {
                     "layer fail RegOpenKeyExW 1 1021\n"
                     "exp ExpGetDword \"HKEY_CURRENT_USER\" " + Scratch + "\" \"x\"\n"
                     "expect error 1021\n"
-                    "layer fail RegQueryValueExW always 5\n"
+                    "layer fail RegQueryValueExW 1 5\n"
                     "layer hide RegDeleteKeyExW\n"
                     "layer version platform 1\n"
                     "layer expect handles 0\n"
@@ -348,20 +343,20 @@ int command(std::vector<std::string> args, std::string* out = nullptr, std::stri
 }
 
 TEST(CommandLine, ExitStatuses) {
-    std::string module = "--module=" + hv::pathBesideProgram("Hivelet.hzx");
+    std::string module = hv::pathBesideProgram("Hivelet.hzx");
     std::string good = scriptFile("good.hvs", "act ActSetRootKey HKEY_USERS\nexpect error 0\n");
     std::string failing = scriptFile("failing.hvs", "act ActSetRootKey root:5\nexpect error 0\n");
     std::string malformed = scriptFile("malformed.hvs", "# x\nact ActSetRootKey HKEY_USERS\"\n");
     std::string out, err;
-    EXPECT_EQ(command({"run", module, good}, &out), 0);
+    EXPECT_EQ(command({"run", "--module", module, good}, &out), 0);
     EXPECT_TRUE(contains(out, "1 script(s), 0 failed")) << out;
-    EXPECT_EQ(command({"run", module, failing, good}, &out, &err), 1);
+    EXPECT_EQ(command({"run", "--module", module, failing, good}, &out, &err), 1);
     EXPECT_TRUE(contains(out, "2 script(s), 1 failed")) << out;
     EXPECT_EQ(err, failing + ":2: expected lastError 0, got 40\n");
-    EXPECT_EQ(command({"run", module, malformed}, &out, &err), 1);
+    EXPECT_EQ(command({"run", "--module", module, malformed}, &out, &err), 1);
     EXPECT_EQ(err, malformed + ":2: stray quote in 'HKEY_USERS\"'\n");
-    EXPECT_EQ(command({"check", good, malformed}, &out, &err), 1);
-    EXPECT_EQ(command({"run", module, testing::TempDir() + "absent.hvs"}, &out, &err), 1);
+    EXPECT_EQ(command({"run", "--module", module, testing::TempDir() + "absent.hvs"}, &out, &err),
+              1);
     EXPECT_TRUE(contains(err, "absent.hvs: cannot read the script")) << err;
 }
 

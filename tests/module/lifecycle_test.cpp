@@ -25,17 +25,17 @@ TEST(Lifecycle, CreateSetsTheFourFieldsWhateverTheHostLeftThere) {
     EXPECT_EQ(hvtest::module().entry<CreateFn>("CreateRunObject")(record.data(), 7, 9), 0);
     uint32_t root, error, view;
     void* key;
-    memcpy(&root, &record[hv::hostLayout.rootKeyIndex], 4);
-    memcpy(&key, &record[hv::hostLayout.currentKey], Ptr);
-    memcpy(&error, &record[hv::hostLayout.lastError], 4);
-    memcpy(&view, &record[hv::hostLayout.use64BitView], 4);
+    memcpy(&root, &record[hv::BuildLayout.rootKeyIndex], 4);
+    memcpy(&key, &record[hv::BuildLayout.currentKey], Ptr);
+    memcpy(&error, &record[hv::BuildLayout.lastError], 4);
+    memcpy(&view, &record[hv::BuildLayout.use64BitView], 4);
     EXPECT_EQ(root, 0u);
     EXPECT_EQ(key, nullptr);
     EXPECT_EQ(error, 0u);
     EXPECT_EQ(view, 0u);
     // The host's header is the host's.
     for (size_t i = 0; i < 184; ++i) ASSERT_EQ(record[i], 0xEE) << "header byte " << i;
-    for (size_t i = hv::hostLayout.use64BitView + 4; i < record.size(); ++i)
+    for (size_t i = hv::BuildLayout.use64BitView + 4; i < record.size(); ++i)
         ASSERT_EQ(record[i], 0xEE) << "byte " << i << " after the record";
 }
 

@@ -6,7 +6,6 @@
 #include <hivelet/host.h>
 
 #include <optional>
-#include <ostream>
 #include <string>
 #include <vector>
 
@@ -21,14 +20,6 @@ struct MenuEntry {
     uint32_t state = 0;             // Command: the state flags GetMenuState reports
     std::vector<MenuEntry> items;   // Popup: its items
 };
-
-// Parameter types of the catalogue.
-namespace paramType {
-constexpr int16_t rootKey = 1000;
-constexpr int16_t text = 45;
-constexpr int16_t integer = 22;
-constexpr int16_t expressionText = 3;
-}  // namespace paramType
 
 // One event's entry, as the Infos entry point gives it, with the two words before it.
 struct EventEntry {
@@ -72,15 +63,5 @@ private:
     Editor& editor_;
     std::u16string parameterText(const Param& param);
 };
-
-// The three menus as trees, each event with its code, display text and parameter titles, as the
-// editor lists them.
-void printEditorView(Catalogue& catalogue, std::ostream& out);
-
-// The catalogue as data for tools such as the help file's generator, in JSON: the object's
-// identity strings and help file name, every event in menu order with its menu path, code,
-// routine, flags, display text and parameters, and the texts of the module's own error codes as
-// "RegErrText$(" gives them. Everything is read from the module through its entry points.
-void printCatalogueJson(Module& module, Catalogue& catalogue, std::ostream& out);
 
 }  // namespace hv

@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace hv {
@@ -19,16 +20,16 @@ using Slot = intptr_t;
 
 // Byte patterns the host fills its memory with, so that tests can tell a byte the module wrote
 // from one it left alone.
-namespace fill {
-constexpr uint8_t record = 0xCC;     // the instance record before CreateRunObject
-constexpr uint8_t runHeader = 0xEE;  // the run header around its services
-constexpr uint8_t infos = 0xA5;      // the RunObjectInfos block before GetRunObjectInfos
-constexpr uint8_t buffer = 0xBE;     // a lent string buffer
-constexpr uint8_t hostBytes = 0xAB;  // host-owned bytes of a RootKeyParam record
-constexpr uint8_t editor = 0xED;     // the editor structure around its fields
-constexpr uint8_t guard = 0xFD;      // sentinels around records and buffers
-constexpr size_t guardSize = 16;
-}  // namespace fill
+namespace Fill {
+constexpr uint8_t Record = 0xCC;           // the instance record before CreateRunObject
+constexpr uint8_t RunHeader = 0xEE;        // the run header around its services
+constexpr uint8_t Infos = 0xA5;            // the RunObjectInfos block before GetRunObjectInfos
+constexpr uint8_t Buffer = 0xBE;           // a lent string buffer
+constexpr uint8_t HostBytes = 0xAB;        // host-owned bytes of a RootKeyParam record
+constexpr uint8_t EditorStructure = 0xED;  // the editor structure around its fields
+constexpr uint8_t Guard = 0xFD;            // sentinels around records and buffers
+constexpr size_t GuardSize = 16;
+}  // namespace Fill
 
 // One parameter of an event, as the editor stored it.
 struct Param {
@@ -39,11 +40,13 @@ struct Param {
     uint32_t rootIndex = 0;  // RootKey: the u32 at byte 6 of a RootKeyParam record
     Slot address = 0;        // Address: passed as is (a text the module returned earlier)
 
-    static Param null();
-    static Param str(std::u16string text);
-    static Param integerValue(int32_t value);
-    static Param rootKey(uint32_t index);
-    static Param rawAddress(const void* address);
+    static Param null() { return Param{}; }
+    static Param str(std::u16string text) { return {Kind::Text, std::move(text)}; }
+    static Param integerValue(int32_t value) { return {Kind::Integer, {}, value}; }
+    static Param rootKey(uint32_t index) { return {Kind::RootKey, {}, 0, index}; }
+    static Param rawAddress(const void* address) {
+        return {Kind::Address, {}, 0, 0, reinterpret_cast<Slot>(address)};
+    }
 };
 
 // What an event gave back, and what the host saw while it ran.
@@ -98,9 +101,8 @@ public:
     struct Tables {
         std::vector<Slot> conditions, actions, expressions;  // each without its null end
         bool conditionsEnd, actionsEnd, expressionsEnd;      // a null entry follows the last one
-        uint16_t conditionCount, actionCount, expressionCount;
-        // The whole block as the module left it (filled with fill::infos before), followed by
-        // fill::guardSize bytes that the module must not write.
+        // The whole block as the module left it (filled with Fill::Infos before), followed by
+        // Fill::GuardSize bytes that the module must not write.
         std::vector<uint8_t> block;
         int16_t infosResult;  // what GetRunObjectInfos returned
     };
@@ -149,32 +151,35 @@ public:
     // can be handed back (Param::rawAddress). Throws std::out_of_range when the module's table
     // has no routine with this code.
     Outcome run(EventKind kind, int code, const std::vector<Param>& params);
-    Outcome condition(int code, const std::vector<Param>& params = {});
-    Outcome action(int code, const std::vector<Param>& params = {});
-    Outcome expression(int code, const std::vector<Param>& params = {});
+    Outcome condition(int code, const std::vector<Param>& params = {}) {
+        return run(EventKind::Condition, code, params);
+    }
+    Outcome action(int code, const std::vector<Param>& params = {}) {
+        return run(EventKind::Action, code, params);
+    }
+    Outcome expression(int code, const std::vector<Param>& params = {}) {
+        return run(EventKind::Expression, code, params);
+    }
 
     // The record as the module sees it.
     uint8_t* record() { return record_; }
     size_t recordSize() const { return recordSize_; }
-    uint32_t rootKeyIndex() const { return readAt<uint32_t>(record_, hostLayout.rootKeyIndex); }
+    uint32_t rootKeyIndex() const { return readAt<uint32_t>(record_, BuildLayout.rootKeyIndex); }
     const char16_t* currentKey() const {
-        return readAt<const char16_t*>(record_, hostLayout.currentKey);
+        return readAt<const char16_t*>(record_, BuildLayout.currentKey);
     }
-    uint32_t lastError() const { return readAt<uint32_t>(record_, hostLayout.lastError); }
-    uint32_t use64BitView() const { return readAt<uint32_t>(record_, hostLayout.use64BitView); }
-    uint16_t headerFlags() const { return readAt<uint16_t>(record_, hostLayout.headerFlags); }
-    void setRootKeyIndex(uint32_t value) { writeAt(record_, hostLayout.rootKeyIndex, value); }
-    void setLastError(uint32_t value) { writeAt(record_, hostLayout.lastError, value); }
-    void setHeaderFlags(uint16_t value) { writeAt(record_, hostLayout.headerFlags, value); }
+    uint32_t lastError() const { return readAt<uint32_t>(record_, BuildLayout.lastError); }
+    uint32_t use64BitView() const { return readAt<uint32_t>(record_, BuildLayout.use64BitView); }
+    uint16_t headerFlags() const { return readAt<uint16_t>(record_, BuildLayout.headerFlags); }
+    void setRootKeyIndex(uint32_t value) { writeAt(record_, BuildLayout.rootKeyIndex, value); }
+    void setLastError(uint32_t value) { writeAt(record_, BuildLayout.lastError, value); }
+    void setHeaderFlags(uint16_t value) { writeAt(record_, BuildLayout.headerFlags, value); }
 
     // The saved state through SaveRunObject and LoadRunObject, on a file handle the host opens
     // (CreateFileW) and closes: the entry point's result, or -1 when the file cannot be opened
     // (`error` then says why).
     int saveState(const std::string& path, std::string* error = nullptr);
     int loadState(const std::string& path, std::string* error = nullptr);
-    // The same through a temporary file: the bytes the module wrote, or the bytes to load.
-    int saveState(std::vector<uint8_t>& bytes);
-    int loadState(const std::vector<uint8_t>& bytes);
 
     // One debugger line, as GetDebugItem leaves the host's 256-character line buffer: the
     // buffer starts filled with 0xBEBE characters and has sentinels after it.
@@ -214,7 +219,6 @@ private:
     void readResult(EventKind kind, Outcome& outcome);
     size_t locateText(const uint8_t* text, Outcome& outcome) const;
     void checkSentinels(Outcome& outcome);
-    std::string damageToRecord() const;
     std::string damageToHeader() const;
 };
 

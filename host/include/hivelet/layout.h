@@ -27,10 +27,10 @@ struct HostLayout {
     // Editor structure.
     size_t editorWindow, getHostVersion, insertProperties, editorSize;
 
-    // RunObjectInfos.
+    // RunObjectInfos: the tables and their counts, the host's own byte, the identifier.
     size_t infoConditions, infoActions, infoExpressions;
     size_t infoConditionCount, infoActionCount, infoExpressionCount;
-    size_t info20, info0, info100, infoHostByte, info0b, infoIdentifier, info1, infoSize;
+    size_t infoHostByte, infoIdentifier, infoSize;
 
     // RootKeyParam: the same on every build.
     size_t rootParamIndex, rootParamSize;
@@ -70,14 +70,9 @@ constexpr HostLayout layoutFor(size_t p) {
     l.infoConditionCount = 3 * p;
     l.infoActionCount = l.infoConditionCount + 2;
     l.infoExpressionCount = l.infoConditionCount + 4;
-    l.info20 = l.infoConditionCount + 6;
-    l.info0 = l.infoConditionCount + 8;
-    l.info100 = l.info0 + 4;
-    l.infoHostByte = l.info100 + 1;
-    l.info0b = l.info100 + 2;
-    l.infoIdentifier = l.info100 + 4;
-    l.info1 = l.infoIdentifier + 4;
-    l.infoSize = l.info1 + 2;
+    l.infoHostByte = l.infoConditionCount + 13;
+    l.infoIdentifier = l.infoConditionCount + 16;
+    l.infoSize = l.infoConditionCount + 22;
 
     l.rootParamIndex = 6;
     l.rootParamSize = 16;
@@ -85,7 +80,7 @@ constexpr HostLayout layoutFor(size_t p) {
 }
 
 // The layout of this build.
-constexpr HostLayout hostLayout = layoutFor(sizeof(void*));
+constexpr HostLayout BuildLayout = layoutFor(sizeof(void*));
 
 // Reads and writes of host fields at byte offsets; memcpy, since many are not aligned.
 template <typename T>

@@ -17,7 +17,7 @@ public:
     // `editor` is the editor structure passed to the entry points; its window owns the dialog.
     ParamEditor(Module& module, Editor& editor);
 
-    // The record's 16 bytes, then fill::guardSize sentinel bytes.
+    // The record's 16 bytes, then Fill::GuardSize sentinel bytes.
     uint8_t* record() { return bytes_.data(); }
     std::vector<uint8_t> recordBytes() const;
     uint32_t rootIndex() const;

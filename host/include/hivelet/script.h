@@ -49,7 +49,7 @@ struct Poke {
     uint32_t value = 0;
 };
 
-// expect [result] VALUE: the last event's result, as written (integers within 32 bits).
+// expect VALUE: the last event's result, as written (integers within 32 bits).
 struct ExpectResult {
     std::variant<int64_t, bool, std::u16string> value;
 };
@@ -71,14 +71,11 @@ struct ExpectAddress {
     Outcome::TextSource place = Outcome::TextSource::Elsewhere;
 };
 
-// expect currentKey "text"|null.
-struct ExpectCurrentKey {
-    std::optional<std::u16string> key;
-};
-
-// expect sentence "text": what the last show line printed.
-struct ExpectSentence {
-    std::u16string text;
+// expect currentKey "text"|null, expect sentence "text": the record's current key, or what the
+// last show line printed.
+struct ExpectText {
+    bool sentence = false;
+    std::string wanted;  // quoted as scripts write texts, or null
 };
 
 // expect debug ITEM "text"|untouched.
@@ -105,52 +102,47 @@ struct Registry {
     std::vector<uint8_t> data;  // the value's bytes exactly as stored
 };
 
-// The lines of the portable layer's own test control; `needs` says why a build without it
+// The lines of the portable layer's own test control; `Needs` says why a build without it
 // skips them.
 struct LayerControl {};
 
 struct Deny : LayerControl {
-    static constexpr const char* needs = "access control";
+    static constexpr const char* Needs = "access control";
     RegistryKey key;
     uint32_t rights = 0;
 };
 
 struct Fail : LayerControl {
-    static constexpr const char* needs = "fault injection";
+    static constexpr const char* Needs = "fault injection";
     std::string function;
-    unsigned nth = 0;  // 1 for the next call; 0 for every call
+    unsigned nth = 1;  // 1 for the next call
     long code = 0;
-};
-
-// layer clear.
-struct Clear : LayerControl {
-    static constexpr const char* needs = "fault injection";
 };
 
 // layer hide|unhide NAME.
 struct Hide : LayerControl {
-    static constexpr const char* needs = "hidden exports";
+    static constexpr const char* Needs = "hidden exports";
     std::string name;
     bool hide = true;
 };
 
-// layer version fail|normal|platform N.
+// layer version fail|normal|platform N: normal is platform 2 (NT), as at start; fail leaves the
+// platform as it is.
 struct Version : LayerControl {
-    static constexpr const char* needs = "GetVersionExW settings";
-    enum class How { Fail, Normal, Platform };
-    How how = How::Normal;
-    uint32_t platform = 0;
+    static constexpr const char* Needs = "GetVersionExW settings";
+    bool fail = false;
+    uint32_t platform = 2;
 };
 
 // layer expect handles N.
 struct Handles : LayerControl {
-    static constexpr const char* needs = "handle count";
+    static constexpr const char* Needs = "handle count";
     size_t count = 0;
 };
 
 // layer expect calls FUNCTION N | FUNCTION mask M.
 struct Calls : LayerControl {
-    static constexpr const char* needs = "call journal";
+    static constexpr const char* Needs = "call journal";
     std::string function;
     bool mask = false;
     uint64_t number = 0;  // the count, or the mask every call must carry
@@ -172,7 +164,7 @@ struct FileBytes {
 // debug: both debugger lines.
 struct Debug {};
 
-// param fill BYTE / param record ROOT|N.
+// param fill BYTE / param record ROOT.
 struct ParamRecord {
     bool fill = false;
     uint32_t value = 0;
@@ -203,17 +195,13 @@ struct ParamExpect {
         Untouched
     };
     What what = What::Index;
-    int64_t number = 0;                 // index, result, selection (LB_ERR: none)
-    std::vector<uint8_t> bytes;         // bytes
-    std::vector<std::u16string> texts;  // items, caption, text
-    std::vector<bool> flags;            // open, ranout
+    std::string wanted;  // as the transcript shows it: "4", "none", "[10 00 ab]", "yes no" ...
 };
 
-using Command =
-    std::variant<Event, Show, Echo, New, Buffers, Poke, ExpectResult, ExpectNumber, ExpectBuffers,
-                 ExpectAddress, ExpectCurrentKey, ExpectSentence, ExpectDebug, Registry, Deny, Fail,
-                 Clear, Hide, Version, Handles, Calls, StateFile, FileBytes, Debug, ParamRecord,
-                 ParamInit, ParamEdit, ParamString, ParamExpect>;
+using Command = std::variant<Event, Show, Echo, New, Buffers, Poke, ExpectResult, ExpectNumber,
+                             ExpectBuffers, ExpectAddress, ExpectText, ExpectDebug, Registry, Deny,
+                             Fail, Hide, Version, Handles, Calls, StateFile, FileBytes, Debug,
+                             ParamRecord, ParamInit, ParamEdit, ParamString, ParamExpect>;
 
 // One line of a script, parsed.
 struct Step {
@@ -246,25 +234,12 @@ ParseResult parse(const std::string& file, const std::string& text);
 // A text as a script would write it: quoted, with escapes for quotes, backslashes and controls.
 std::string quote(const std::u16string& text);
 
-// Runs scripts against one loaded module and writes a transcript. Each script gets a fresh
-// instance; a failure stops its script.
-class Runner {
-public:
-    Runner(Module& module, std::ostream& out, std::ostream& err);
-    // Runs a parsed script; true when every line passed.
-    bool run(const Script& script);
-    // Reads, parses and runs a script file; true when every line passed.
-    bool runFile(const std::string& path);
-    // Whether the portable layer's test control is there to run layer lines: on Linux builds
-    // by default. Without it every layer line is skipped with a note, as on Windows builds.
-    void setLayer(bool present);
-
-private:
-    Module& module_;
-    std::ostream& out_;
-    std::ostream& err_;
-    bool layer_;
-};
+// Runs a parsed script on a fresh instance of the module, writing its transcript to `out` and
+// its first failure, which stops it, to `err`; true when every line passed. Layer lines run
+// where the portable layer's test control is there (Linux builds) unless `layer` is false;
+// without it each is skipped with a note, as on Windows builds.
+bool runScript(Module& module, const Script& script, std::ostream& out, std::ostream& err,
+               bool layer = true);
 
 // The hivelet-host command line (without the program name); returns the exit status:
 // 0 when every script passed, 1 when one failed, 2 for a usage error or a module that cannot
