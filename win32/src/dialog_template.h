@@ -3,7 +3,7 @@
 // past them; extended templates (DLGTEMPLATEEX) are not read.
 #pragma once
 
-#include <w32/testctl.h>
+#include "internal.h"
 
 #include <string>
 #include <vector>
@@ -17,32 +17,25 @@ struct TemplateId {
     std::u16string text;
 };
 
+// The fields the layer's dialogs use; positions, sizes, extended styles, the menu, the class
+// and the font are read past.
 struct DialogItemTemplate {
     DWORD style = 0;
-    DWORD exStyle = 0;
-    short x = 0, y = 0, cx = 0, cy = 0;
     WORD id = 0;
     TemplateId windowClass;
     TemplateId title;
-    WORD extraBytes = 0;  // creation data that follows the item, skipped
 };
 
 struct DialogTemplate {
     DWORD style = 0;
-    DWORD exStyle = 0;
-    short x = 0, y = 0, cx = 0, cy = 0;
-    TemplateId menu;
-    TemplateId windowClass;
     std::u16string title;
-    WORD pointSize = 0;  // with DS_SETFONT only
-    std::u16string fontName;
     std::vector<DialogItemTemplate> items;
 };
 
-enum class TemplateStatus { ok, truncated, extended };
+enum class TemplateStatus { Ok, Truncated, Extended };
 
 // Reads a template at the start of `data` (which the resource image aligns to a DWORD).
-W32_TEST_API TemplateStatus readDialogTemplate(const BYTE* data, size_t size,
+W32_INTERNAL TemplateStatus readDialogTemplate(const BYTE* data, size_t size,
                                                DialogTemplate* out);
 
 }  // namespace w32

@@ -2,7 +2,6 @@
 // the dynamic loader. A library's resources are the compiled resource file that its build
 // embedded as the symbol W32ResourceSection; its entry function is its exported DllMain.
 #include "internal.h"
-#include "registry.h"
 #include "resources.h"
 
 #include <dlfcn.h>
@@ -27,11 +26,10 @@ struct LoadedLibrary {
 std::mutex libraryLock;
 std::map<void*, LoadedLibrary*> loaded;  // by dlopen handle, so a second load shares the first
 
-// System DLL names a module may load; their functions are this layer's own.
+// The system library the module loads; its functions are this layer's own.
 bool isSystemLibrary(std::string name) {
     for (char& c : name) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
-    return name == "advapi32.dll" || name == "advapi32" || name == "kernel32.dll" ||
-           name == "kernel32" || name == "user32.dll" || name == "user32";
+    return name == "advapi32.dll" || name == "advapi32";
 }
 
 void* layerHandle() {
@@ -47,6 +45,8 @@ typedef BOOL(WINAPI* EntryFunction)(HINSTANCE, DWORD, LPVOID);
 static LoadedLibrary* attach(void* dl, bool system);
 
 namespace w32 {
+
+Control control;
 
 std::string toUtf8(const WCHAR* text) {
     std::string out;
@@ -95,8 +95,6 @@ HMODULE WINAPI LoadLibraryW(LPCWSTR fileName) {
     LoadedLibrary* lib = nullptr;
     if (auto code = w32::takeFault("LoadLibraryW")) {
         SetLastError(static_cast<DWORD>(*code));
-    } else if (!fileName) {
-        SetLastError(ERROR_INVALID_PARAMETER);
     } else if (void* dl = system ? layerHandle() : dlopen(name.c_str(), RTLD_NOW | RTLD_LOCAL)) {
         lib = attach(dl, system);
     } else {
@@ -127,7 +125,7 @@ static LoadedLibrary* attach(void* dl, bool system) {
             dlclose(dl);
             delete lib;
             lib = nullptr;
-            SetLastError(1114);  // ERROR_DLL_INIT_FAILED
+            SetLastError(ERROR_DLL_INIT_FAILED);
             return nullptr;
         }
     }
@@ -142,7 +140,7 @@ FARPROC WINAPI GetProcAddress(HMODULE module, LPCSTR procName) {
         SetLastError(static_cast<DWORD>(*code));
     } else if (!lib || !procName) {
         SetLastError(ERROR_INVALID_HANDLE);
-    } else if (lib->system && w32::exportHidden(procName)) {
+    } else if (lib->system && w32::control.exportHidden && w32::control.exportHidden(procName)) {
         SetLastError(ERROR_PROC_NOT_FOUND);  // a test made the system library lack it
     } else if (!(symbol = dlsym(lib->dl, procName))) {
         SetLastError(ERROR_PROC_NOT_FOUND);

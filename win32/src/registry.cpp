@@ -10,8 +10,6 @@ namespace {
 
 bool isEmptyPath(const WCHAR* path) { return !path || !path[0]; }
 
-bool bothViews(REGSAM sam) { return (sam & kViewBits) == kViewBits; }
-
 std::u16string_view valueName(const WCHAR* name) {
     return name ? std::u16string_view(name) : std::u16string_view();
 }
@@ -33,24 +31,27 @@ LONG serve(std::string_view function, HKEY* outHandle, Body body) {
     }
 }
 
-// A new handle to `key` if the key grants what `sam` asks for.
+// A new handle to `key` if the key grants what `sam` asks for (the view bits ask for nothing).
 LONG grant(Registry& r, Key& key, REGSAM sam, HKEY* out) {
-    DWORD rights = requestedRights(sam, key.denied);
+    DWORD rights = sam & KEY_ALL_ACCESS;
     if (rights & key.denied) return ERROR_ACCESS_DENIED;
     *out = addHandle(r, key, rights);
     return ERROR_SUCCESS;
 }
 
 // The checks open, create and delete make on the start key and the path, in Windows' order;
-// `names` receives the path's components.
-LONG startWalk(const Bound& start, const WCHAR* path, Names& names) {
+// `way` receives the walk the path takes in the view of `sam`.
+LONG startWalk(Registry& r, const Bound& start, const WCHAR* path, REGSAM sam, Route& way) {
     if (LONG code = checkLeading(path, start)) return code;
     if (start.key->deleted) return ERROR_KEY_DELETED;
-    return splitPath(path, names);
+    Names names;
+    if (LONG code = splitPath(path, names)) return code;
+    way = route(r, *start.key, names, sam);
+    return ERROR_SUCCESS;
 }
 
 LONG openKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam, HKEY* out) {
-    if (!out || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    if (!out) return ERROR_INVALID_PARAMETER;
     Bound start;
     if (LONG code = bind(r, parent, start)) return code;  // *out untouched, as on Windows
     // "" or NULL on a predefined root hands back the predefined value itself.
@@ -59,26 +60,24 @@ LONG openKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam, HKEY* out)
         return ERROR_SUCCESS;
     }
     *out = nullptr;
-    Names names;
-    if (LONG code = startWalk(start, path, names)) return code;
-    Route way = route(r, *start.key, names, sam);
+    Route way;
+    if (LONG code = startWalk(r, start, path, sam, way)) return code;
     Key* key = findKey(*way.from, way.names);
     if (!key) return ERROR_FILE_NOT_FOUND;
     return grant(r, *key, sam, out);
 }
 
-LONG createKey(Registry& r, HKEY parent, const WCHAR* path, DWORD reserved, REGSAM sam,
-               HKEY* out, DWORD* disposition) {
+LONG createKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam, HKEY* out,
+               DWORD* disposition) {
     // A NULL out pointer: Windows' answer is recorded nowhere and Wine crashes (both process
     // kinds); 87, as RegOpenKeyExW answers.
-    if (!out || reserved || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    if (!out) return ERROR_INVALID_PARAMETER;
     Bound start;
     if (LONG code = bind(r, parent, start)) return code;
     *out = nullptr;
     // A NULL path, documented as not allowed, names the key itself as "" does (Wine: 0).
-    Names names;
-    if (LONG code = startWalk(start, path, names)) return code;
-    Route way = route(r, *start.key, names, sam);
+    Route way;
+    if (LONG code = startWalk(r, start, path, sam, way)) return code;
     Key* key = nullptr;
     bool created = false;
     if (LONG code = createPath(*way.from, way.names, key, created)) return code;
@@ -89,13 +88,12 @@ LONG createKey(Registry& r, HKEY parent, const WCHAR* path, DWORD reserved, REGS
 }
 
 LONG deleteKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam) {
-    if (!path || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    if (!path) return ERROR_INVALID_PARAMETER;
     Bound start;
     if (LONG code = bind(r, parent, start)) return code;
-    Names names;
-    if (LONG code = startWalk(start, path, names)) return code;
     // The parent handle's rights do not matter: Windows opens the subkey itself with DELETE.
-    Route way = route(r, *start.key, names, sam);
+    Route way;
+    if (LONG code = startWalk(r, start, path, sam, way)) return code;
     Key* key = findKey(*way.from, way.names);
     return key ? removeKey(*key) : ERROR_FILE_NOT_FOUND;
 }
@@ -118,8 +116,7 @@ LONG setValue(Registry& r, HKEY handle, const WCHAR* name, DWORD type, const BYT
     Bound at;
     if (LONG code = bindFor(r, handle, KEY_SET_VALUE, at)) return code;
     std::u16string_view label = valueName(name);
-    if (label.size() > kMaxValueNameLength) return ERROR_INVALID_PARAMETER;
-    if (!data && size) return ERROR_NOACCESS;
+    if (label.size() > MaxValueNameLength) return ERROR_INVALID_PARAMETER;
     if (data) size = storedSize(type, data, size);
     auto found = at.key->values.find(RawName{label});
     if (found == at.key->values.end())  // a new value; an existing one keeps its first spelling
@@ -142,9 +139,8 @@ void terminate(const Value& value, BYTE* data, DWORD capacity) {
     data[n] = data[n + 1] = 0;
 }
 
-LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* reserved, DWORD* type,
-                BYTE* data, DWORD* size) {
-    if (reserved || (data && !size)) return ERROR_INVALID_PARAMETER;
+LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* type, BYTE* data,
+                DWORD* size) {
     Bound at;
     if (LONG code = bindFor(r, handle, KEY_QUERY_VALUE, at)) return code;
     auto it = at.key->values.find(RawName{valueName(name)});
@@ -176,34 +172,17 @@ LONG deleteValue(Registry& r, HKEY handle, const WCHAR* name) {
     return ERROR_SUCCESS;
 }
 
-// Keys have no class here: a class buffer receives an empty string.
-LONG emptyClass(WCHAR* cls, DWORD* length) {
-    if (!cls) return ERROR_SUCCESS;
-    if (!length) return ERROR_INVALID_PARAMETER;
-    if (*length < 1) return ERROR_MORE_DATA;
-    cls[0] = 0;
-    *length = 0;
-    return ERROR_SUCCESS;
-}
-
-LONG enumKey(Registry& r, HKEY handle, DWORD index, WCHAR* name, DWORD* length, DWORD* reserved,
-             WCHAR* cls, DWORD* classLength, FILETIME* written) {
-    // NULL name or length: Windows' answer is recorded nowhere and Wine crashes; 87 here.
-    if (reserved || !name || !length) return ERROR_INVALID_PARAMETER;
+// Only the name is served: callers ask for no class and no time of the last write.
+LONG enumKey(Registry& r, HKEY handle, DWORD index, WCHAR* name, DWORD* length) {
     Bound at;
     if (LONG code = bindFor(r, handle, KEY_ENUMERATE_SUB_KEYS, at)) return code;
     const Key* child = childAt(*at.key, index);
     if (!child) return ERROR_NO_MORE_ITEMS;
     // The name must fit with its terminator; if not, neither buffer nor count is written.
     if (*length <= child->name.size()) return ERROR_MORE_DATA;
-    if (LONG code = emptyClass(cls, classLength)) return code;
     std::memcpy(name, child->name.data(), child->name.size() * sizeof(WCHAR));
     name[child->name.size()] = 0;
     *length = static_cast<DWORD>(child->name.size());
-    if (written) {
-        written->dwLowDateTime = static_cast<DWORD>(child->lastWrite);
-        written->dwHighDateTime = static_cast<DWORD>(child->lastWrite >> 32);
-    }
     return ERROR_SUCCESS;
 }
 
@@ -234,7 +213,7 @@ LSTATUS WINAPI RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD Reserved, LPWS
                                LPSECURITY_ATTRIBUTES lpSecurityAttributes, PHKEY phkResult,
                                LPDWORD lpdwDisposition) {
     LONG code = serve("RegCreateKeyExW", phkResult, [&](Registry& r) {
-        return createKey(r, hKey, lpSubKey, Reserved, samDesired, phkResult, lpdwDisposition);
+        return createKey(r, hKey, lpSubKey, samDesired, phkResult, lpdwDisposition);
     });
     w32::record("RegCreateKeyExW",
                 {w32::arg(hKey), w32::arg(lpSubKey), Reserved, w32::arg(lpClass), dwOptions,
@@ -247,7 +226,7 @@ LSTATUS WINAPI RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD Reserved, LPWS
 LSTATUS WINAPI RegQueryValueExW(HKEY hKey, LPCWSTR lpValueName, LPDWORD lpReserved,
                                 LPDWORD lpType, LPBYTE lpData, LPDWORD lpcbData) {
     LONG code = serve("RegQueryValueExW", nullptr, [&](Registry& r) {
-        return queryValue(r, hKey, lpValueName, lpReserved, lpType, lpData, lpcbData);
+        return queryValue(r, hKey, lpValueName, lpType, lpData, lpcbData);
     });
     w32::record("RegQueryValueExW",
                 {w32::arg(hKey), w32::arg(lpValueName), w32::arg(lpReserved), w32::arg(lpType),
@@ -297,8 +276,7 @@ LSTATUS WINAPI RegEnumKeyExW(HKEY hKey, DWORD dwIndex, LPWSTR lpName, LPDWORD lp
                              LPDWORD lpReserved, LPWSTR lpClass, LPDWORD lpcchClass,
                              PFILETIME lpftLastWriteTime) {
     LONG code = serve("RegEnumKeyExW", nullptr, [&](Registry& r) {
-        return enumKey(r, hKey, dwIndex, lpName, lpcchName, lpReserved, lpClass, lpcchClass,
-                       lpftLastWriteTime);
+        return enumKey(r, hKey, dwIndex, lpName, lpcchName);
     });
     w32::record("RegEnumKeyExW",
                 {w32::arg(hKey), dwIndex, w32::arg(lpName), w32::arg(lpcchName),

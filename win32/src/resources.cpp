@@ -10,9 +10,9 @@ namespace {
 
 // Fixed fields after TYPE and NAME: DataVersion, MemoryFlags, LanguageId, Version,
 // Characteristics.
-constexpr size_t fixedTailSize = 16;
-constexpr size_t smallestHeaderSize = 8 + 4 + 4 + fixedTailSize;
-constexpr WORD stringsPerBlock = 16;
+constexpr size_t FixedTailSize = 16;
+constexpr size_t SmallestHeaderSize = 8 + 4 + 4 + FixedTailSize;
+constexpr WORD StringsPerBlock = 16;
 
 // Little-endian fields, read bytewise: an image need not be aligned in memory.
 WORD read16(const BYTE* at) { return static_cast<WORD>(at[0] | (at[1] << 8)); }
@@ -78,11 +78,11 @@ bool ResourceReader::next(ResourceRecord* record) {
 // Reads the record at offset_ and moves offset_ to the next one.
 bool ResourceReader::readRecord(ResourceRecord* record) {
     size_t left = size_ - offset_;
-    if (left < smallestHeaderSize) return false;
+    if (left < SmallestHeaderSize) return false;
     const BYTE* start = image_ + offset_;
     DWORD dataSize = read32(start);
     DWORD headerSize = read32(start + 4);
-    if (headerSize < smallestHeaderSize || headerSize % 4 != 0 || headerSize > left ||
+    if (headerSize < SmallestHeaderSize || headerSize % 4 != 0 || headerSize > left ||
         dataSize > left - headerSize)
         return false;
     size_t at = 8;
@@ -90,7 +90,7 @@ bool ResourceReader::readRecord(ResourceRecord* record) {
         !readId(start, headerSize, &at, &record->name))
         return false;
     at += padToDword(at);
-    if (at > headerSize || headerSize - at < fixedTailSize) return false;
+    if (at > headerSize || headerSize - at < FixedTailSize) return false;
     record->language = read16(start + at + 6);
     record->data = start + headerSize;
     record->size = dataSize;
@@ -117,11 +117,11 @@ ResourceStatus lookupResource(const BYTE* image, size_t imageSize, WORD type, WO
         nameSeen = true;
     }
     // A damaged image could list anything; nothing in it is trusted.
-    if (reader.malformed() || !image) return ResourceStatus::noResources;
-    if (!nameSeen) return typeSeen ? ResourceStatus::nameNotFound : ResourceStatus::typeNotFound;
+    if (reader.malformed() || !image) return ResourceStatus::NoResources;
+    if (!nameSeen) return typeSeen ? ResourceStatus::NameNotFound : ResourceStatus::TypeNotFound;
     *data = chosen.data;
     *size = chosen.size;
-    return ResourceStatus::found;
+    return ResourceStatus::Found;
 }
 
 const BYTE* blockString(const BYTE* block, size_t size, unsigned index, WORD* length) {
@@ -143,11 +143,11 @@ bool findResource(HINSTANCE instance, WORD type, WORD name, WORD language, const
                   size_t* size) {
     const BYTE* image = nullptr;
     size_t imageSize = 0;
-    ResourceStatus status = ResourceStatus::noResources;
+    ResourceStatus status = ResourceStatus::NoResources;
     if (resourceImage(instance, &image, &imageSize))
         status = lookupResource(image, imageSize, type, name, language, data, size);
-    if (status != ResourceStatus::found) SetLastError(static_cast<DWORD>(status));
-    return status == ResourceStatus::found;
+    if (status != ResourceStatus::Found) SetLastError(static_cast<DWORD>(status));
+    return status == ResourceStatus::Found;
 }
 
 }  // namespace w32
@@ -179,14 +179,14 @@ int loadString(HINSTANCE instance, UINT id, LPWSTR buffer, int bufferMax) {
     if (!buffer || bufferMax < 0) return 0;
     // String ids are 16-bit; as on Windows, the high word of `id` is ignored.
     WORD number = LOWORD(id);
-    auto blockId = static_cast<WORD>(number / stringsPerBlock + 1);
+    auto blockId = static_cast<WORD>(number / StringsPerBlock + 1);
     const BYTE* block = nullptr;
     size_t blockSize = 0;
-    if (!w32::findResource(instance, w32::resourceTypeString, blockId, w32::languageUsEnglish,
+    if (!w32::findResource(instance, w32::ResourceTypeString, blockId, w32::LanguageUsEnglish,
                            &block, &blockSize))
         return 0;
     WORD length = 0;
-    const BYTE* text = w32::blockString(block, blockSize, number % stringsPerBlock, &length);
+    const BYTE* text = w32::blockString(block, blockSize, number % StringsPerBlock, &length);
     return copyString(text, length, buffer, bufferMax);
 }
 
