@@ -71,6 +71,10 @@ protected:
         ++*reinterpret_cast<int*>(count);
         return TRUE;
     }
+    static BOOL CALLBACK firstWindow(HWND window, LPARAM found) {
+        *reinterpret_cast<HWND*>(found) = window;
+        return FALSE;
+    }
     static INT_PTR run(WORD id = 101, HWND owner = nullptr) {
         return DialogBoxParamW(module, MAKEINTRESOURCEW(id), owner, testProc, 0x5EED);
     }
@@ -145,6 +149,10 @@ TEST_F(Dialogs, InitialisationUserSlotAndWindows) {
         EXPECT_EQ(WString(text), TEXT("Select"));
         EXPECT_EQ(GetDlgCtrlID(GetDlgItem(dialog, ListId)), ListId);
         EXPECT_EQ(GetParent(GetDlgItem(dialog, ListId)), dialog);
+        HWND found = nullptr;  // the thread's one top-level window, where the walk stops
+        EXPECT_FALSE(EnumThreadWindows(GetCurrentThreadId(), firstWindow,
+                                       reinterpret_cast<LPARAM>(&found)));
+        EXPECT_EQ(found, dialog);
         EXPECT_NE(GetDlgItem(dialog, IDCANCEL), nullptr);
         EXPECT_EQ(GetDlgItem(dialog, 77), nullptr);
         PostMessageW(dialog, WM_COMMAND, IDCANCEL, 0);

@@ -3,19 +3,12 @@
 // past them; extended templates (DLGTEMPLATEEX) are not read.
 #pragma once
 
-#include "internal.h"
+#include "byte_cursor.h"
 
 #include <string>
 #include <vector>
 
 namespace w32 {
-
-// A menu, class or title field: an ordinal (0xFFFF, n) or a text (possibly empty).
-struct TemplateId {
-    bool isOrdinal = false;
-    WORD ordinal = 0;
-    std::u16string text;
-};
 
 // The fields the layer's dialogs use; positions, sizes, extended styles, the menu, the class
 // and the font are read past.

@@ -24,11 +24,15 @@ Files& files() {
     return *f;
 }
 
-int descriptorOf(HANDLE handle) {
+// The descriptor behind a handle, or -1; `release` also forgets the handle.
+int descriptorOf(HANDLE handle, bool release = false) {
     Files& f = files();
     std::lock_guard<std::mutex> guard(f.lock);
     auto it = f.descriptors.find(reinterpret_cast<uintptr_t>(handle));
-    return it == f.descriptors.end() ? -1 : it->second;
+    if (it == f.descriptors.end()) return -1;
+    int fd = it->second;
+    if (release) f.descriptors.erase(it);
+    return fd;
 }
 
 DWORD errnoCode(int error) {
@@ -136,16 +140,7 @@ HANDLE WINAPI CreateFileW(LPCWSTR name, DWORD access, DWORD, LPSECURITY_ATTRIBUT
 }
 
 BOOL WINAPI CloseHandle(HANDLE handle) {
-    int fd = -1;
-    {
-        Files& f = files();
-        std::lock_guard<std::mutex> guard(f.lock);
-        auto it = f.descriptors.find(reinterpret_cast<uintptr_t>(handle));
-        if (it != f.descriptors.end()) {
-            fd = it->second;
-            f.descriptors.erase(it);
-        }
-    }
+    int fd = descriptorOf(handle, true);
     BOOL ok = fd >= 0 && close(fd) == 0;
     if (fd < 0) SetLastError(ERROR_INVALID_HANDLE);
     w32::record("CloseHandle", {w32::arg(handle)}, ok);

@@ -35,7 +35,7 @@ int wsprintfW(LPWSTR buffer, LPCWSTR form, ...) {
     out.copy(buffer, kept);
     buffer[kept] = 0;
     // Wine reports 1024 for an output that reached the limit, although 1023 were written.
-    int result = out.size() >= OutputLimit - 1 ? static_cast<int>(OutputLimit) : static_cast<int>(kept);
+    auto result = static_cast<int>(out.size() >= OutputLimit - 1 ? OutputLimit : kept);
     w32::record("wsprintfW", {w32::arg(buffer), w32::arg(form)}, result);
     return result;
 }

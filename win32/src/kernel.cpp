@@ -40,9 +40,31 @@ void* layerHandle() {
 
 typedef BOOL(WINAPI* EntryFunction)(HINSTANCE, DWORD, LPVOID);
 
-}  // namespace
+// Registers a library the dynamic loader has opened and runs its entry function the first time.
+LoadedLibrary* attach(void* dl, bool system) {
+    std::lock_guard<std::mutex> guard(libraryLock);
+    auto found = loaded.find(dl);
+    if (found != loaded.end()) {
+        dlclose(dl);  // the dynamic loader counted this open too
+        ++found->second->references;
+        return found->second;
+    }
+    auto* image = static_cast<const BYTE*>(dlsym(dl, "W32ResourceSection"));
+    auto* imageSize = static_cast<const size_t*>(dlsym(dl, "W32ResourceSectionSize"));
+    auto* lib = new LoadedLibrary{dl, system, 1, image, imageSize ? *imageSize : 0};
+    void* entry = system ? nullptr : dlsym(dl, "DllMain");
+    if (entry && !reinterpret_cast<EntryFunction>(entry)(reinterpret_cast<HINSTANCE>(lib),
+                                                         DLL_PROCESS_ATTACH, nullptr)) {
+        dlclose(dl);
+        delete lib;
+        SetLastError(ERROR_DLL_INIT_FAILED);
+        return nullptr;
+    }
+    loaded[dl] = lib;
+    return lib;
+}
 
-static LoadedLibrary* attach(void* dl, bool system);
+}  // namespace
 
 namespace w32 {
 
@@ -102,35 +124,6 @@ HMODULE WINAPI LoadLibraryW(LPCWSTR fileName) {
     }
     w32::record("LoadLibraryW", {w32::arg(fileName)}, w32::arg(lib));
     return reinterpret_cast<HMODULE>(lib);
-}
-
-// Registers a library the dynamic loader has opened and runs its entry function the first time.
-static LoadedLibrary* attach(void* dl, bool system) {
-    std::lock_guard<std::mutex> guard(libraryLock);
-    auto found = loaded.find(dl);
-    if (found != loaded.end()) {
-        dlclose(dl);  // the dynamic loader counted this open too
-        ++found->second->references;
-        return found->second;
-    }
-    LoadedLibrary* lib = nullptr;
-    {
-        auto* image = static_cast<const BYTE*>(dlsym(dl, "W32ResourceSection"));
-        auto* imageSize = static_cast<const size_t*>(dlsym(dl, "W32ResourceSectionSize"));
-        lib = new LoadedLibrary{dl, system, 1, image, imageSize ? *imageSize : 0};
-        void* entry = system ? nullptr : dlsym(dl, "DllMain");
-        if (entry &&
-            !reinterpret_cast<EntryFunction>(entry)(reinterpret_cast<HINSTANCE>(lib),
-                                                    DLL_PROCESS_ATTACH, nullptr)) {
-            dlclose(dl);
-            delete lib;
-            lib = nullptr;
-            SetLastError(ERROR_DLL_INIT_FAILED);
-            return nullptr;
-        }
-    }
-    loaded[dl] = lib;
-    return lib;
 }
 
 FARPROC WINAPI GetProcAddress(HMODULE module, LPCSTR procName) {

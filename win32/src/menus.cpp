@@ -4,6 +4,7 @@
 
 #include <cstring>
 
+#include "byte_cursor.h"
 #include "resources.h"
 
 using namespace w32;
@@ -59,47 +60,27 @@ const Item* itemAt(Menus& m, HMENU handle, int position) {
 // Reads a standard menu template into `menu`, one level at a time.
 class TemplateReader {
 public:
-    TemplateReader(Menus& m, const BYTE* data, size_t size) : m_(m), data_(data), size_(size) {}
+    TemplateReader(Menus& m, const BYTE* data, size_t size) : m_(m), c_(data, size) {}
 
     bool read(HMENU menu) {
-        if (size_ < 4) return false;
-        WORD version = word(0), offset = word(2);
+        WORD version = 0, offset = 0;
+        if (!c_.word(&version) || !c_.word(&offset)) return false;
         if (version != 0) return false;  // extended templates are not supported
-        at_ = 4 + size_t{offset};
-        return level(menu, 0);
+        return c_.skip(offset) && level(menu, 0);
     }
 
 private:
     Menus& m_;
-    const BYTE* data_;
-    size_t size_;
-    size_t at_ = 0;
-
-    WORD word(size_t at) const { return static_cast<WORD>(data_[at] | (data_[at + 1] << 8)); }
-
-    bool readWord(WORD* value) {
-        if (at_ > size_ || size_ - at_ < 2) return false;
-        *value = word(at_);
-        at_ += 2;
-        return true;
-    }
-
-    bool readText(std::u16string* text) {
-        for (WORD c = 0;;) {
-            if (!readWord(&c)) return false;
-            if (c == 0) return true;
-            text->push_back(static_cast<char16_t>(c));
-        }
-    }
+    Cursor c_;
 
     bool level(HMENU handle, unsigned depth) {
         if (depth > MenuDepthLimit) return false;
         for (;;) {
             WORD option = 0, id = 0;
             Item item;
-            if (!readWord(&option)) return false;
-            if (!(option & MF_POPUP) && !readWord(&id)) return false;
-            if (!readText(&item.text)) return false;
+            if (!c_.word(&option)) return false;
+            if (!(option & MF_POPUP) && !c_.word(&id)) return false;
+            if (!c_.text(&item.text)) return false;
             item.hasText = true;
             item.id = id;
             item.flags = option & MF_POPUP;

@@ -5,6 +5,7 @@
 #include <new>
 
 using namespace w32::reg;
+using w32::arg;
 
 namespace {
 
@@ -17,7 +18,7 @@ std::u16string_view valueName(const WCHAR* name) {
 // Runs one registry call: an injected fault answers first and touches nothing but the out
 // handle; otherwise the call runs under the registry's lock and running out of memory is a code.
 template <typename Body>
-LONG serve(std::string_view function, HKEY* outHandle, Body body) {
+LONG run(std::string_view function, HKEY* outHandle, Body body) {
     if (auto code = w32::takeFault(function)) {
         if (outHandle) *outHandle = nullptr;
         return static_cast<LONG>(*code);
@@ -29,6 +30,15 @@ LONG serve(std::string_view function, HKEY* outHandle, Body body) {
     } catch (const std::bad_alloc&) {
         return ERROR_OUTOFMEMORY;
     }
+}
+
+// Runs the call and journals it with its arguments, in Windows' order.
+template <typename Body>
+LONG serve(std::string_view function, std::initializer_list<uint64_t> args, HKEY* outHandle,
+           Body body) {
+    LONG code = run(function, outHandle, body);
+    w32::record(function, args, code);
+    return code;
 }
 
 // A new handle to `key` if the key grants what `sam` asks for (the view bits ask for nothing).
@@ -119,8 +129,8 @@ LONG setValue(Registry& r, HKEY handle, const WCHAR* name, DWORD type, const BYT
     if (label.size() > MaxValueNameLength) return ERROR_INVALID_PARAMETER;
     if (data) size = storedSize(type, data, size);
     auto found = at.key->values.find(RawName{label});
-    if (found == at.key->values.end())  // a new value; an existing one keeps its first spelling
-        found = at.key->values.emplace(fold(label), Value{std::u16string(label)}).first;
+    if (found == at.key->values.end())
+        found = at.key->values.emplace(fold(label), Value()).first;
     Value& value = found->second;
     value.type = type;
     value.data.clear();
@@ -199,95 +209,71 @@ LONG closeKey(Registry& r, HKEY handle) {
 
 LSTATUS WINAPI RegOpenKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD ulOptions, REGSAM samDesired,
                              PHKEY phkResult) {
-    LONG code = serve("RegOpenKeyExW", phkResult, [&](Registry& r) {
-        return openKey(r, hKey, lpSubKey, samDesired, phkResult);
-    });
-    w32::record("RegOpenKeyExW",
-                {w32::arg(hKey), w32::arg(lpSubKey), ulOptions, samDesired, w32::arg(phkResult)},
-                code);
-    return code;
+    return serve("RegOpenKeyExW", {arg(hKey), arg(lpSubKey), ulOptions, samDesired, arg(phkResult)},
+                 phkResult,
+                 [&](Registry& r) { return openKey(r, hKey, lpSubKey, samDesired, phkResult); });
 }
 
 LSTATUS WINAPI RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD Reserved, LPWSTR lpClass,
                                DWORD dwOptions, REGSAM samDesired,
                                LPSECURITY_ATTRIBUTES lpSecurityAttributes, PHKEY phkResult,
                                LPDWORD lpdwDisposition) {
-    LONG code = serve("RegCreateKeyExW", phkResult, [&](Registry& r) {
-        return createKey(r, hKey, lpSubKey, samDesired, phkResult, lpdwDisposition);
-    });
-    w32::record("RegCreateKeyExW",
-                {w32::arg(hKey), w32::arg(lpSubKey), Reserved, w32::arg(lpClass), dwOptions,
-                 samDesired, w32::arg(lpSecurityAttributes), w32::arg(phkResult),
-                 w32::arg(lpdwDisposition)},
-                code);
-    return code;
+    return serve("RegCreateKeyExW",
+                 {arg(hKey), arg(lpSubKey), Reserved, arg(lpClass), dwOptions, samDesired,
+                  arg(lpSecurityAttributes), arg(phkResult), arg(lpdwDisposition)},
+                 phkResult, [&](Registry& r) {
+                     return createKey(r, hKey, lpSubKey, samDesired, phkResult, lpdwDisposition);
+                 });
 }
 
 LSTATUS WINAPI RegQueryValueExW(HKEY hKey, LPCWSTR lpValueName, LPDWORD lpReserved,
                                 LPDWORD lpType, LPBYTE lpData, LPDWORD lpcbData) {
-    LONG code = serve("RegQueryValueExW", nullptr, [&](Registry& r) {
-        return queryValue(r, hKey, lpValueName, lpType, lpData, lpcbData);
-    });
-    w32::record("RegQueryValueExW",
-                {w32::arg(hKey), w32::arg(lpValueName), w32::arg(lpReserved), w32::arg(lpType),
-                 w32::arg(lpData), w32::arg(lpcbData)},
-                code);
-    return code;
+    return serve("RegQueryValueExW",
+                 {arg(hKey), arg(lpValueName), arg(lpReserved), arg(lpType), arg(lpData),
+                  arg(lpcbData)},
+                 nullptr, [&](Registry& r) {
+                     return queryValue(r, hKey, lpValueName, lpType, lpData, lpcbData);
+                 });
 }
 
+// Reserved is ignored: Windows stores the value with Reserved 1 too.
 LSTATUS WINAPI RegSetValueExW(HKEY hKey, LPCWSTR lpValueName, DWORD Reserved, DWORD dwType,
                               const BYTE* lpData, DWORD cbData) {
-    // Reserved is ignored: Windows stores the value with Reserved 1 too.
-    LONG code = serve("RegSetValueExW", nullptr, [&](Registry& r) {
-        return setValue(r, hKey, lpValueName, dwType, lpData, cbData);
-    });
-    w32::record("RegSetValueExW",
-                {w32::arg(hKey), w32::arg(lpValueName), Reserved, dwType, w32::arg(lpData),
-                 cbData},
-                code);
-    return code;
+    return serve("RegSetValueExW",
+                 {arg(hKey), arg(lpValueName), Reserved, dwType, arg(lpData), cbData}, nullptr,
+                 [&](Registry& r) {
+                     return setValue(r, hKey, lpValueName, dwType, lpData, cbData);
+                 });
 }
 
+// No view flag: the process's default view, the 32-bit one.
 LSTATUS WINAPI RegDeleteKeyW(HKEY hKey, LPCWSTR lpSubKey) {
-    // No view flag: the process's default view, the 32-bit one.
-    LONG code = serve("RegDeleteKeyW", nullptr,
-                      [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, 0); });
-    w32::record("RegDeleteKeyW", {w32::arg(hKey), w32::arg(lpSubKey)}, code);
-    return code;
+    return serve("RegDeleteKeyW", {arg(hKey), arg(lpSubKey)}, nullptr,
+                 [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, 0); });
 }
 
+// Reserved is ignored, as Windows does; only the view bits of samDesired count.
 LSTATUS WINAPI RegDeleteKeyExW(HKEY hKey, LPCWSTR lpSubKey, REGSAM samDesired, DWORD Reserved) {
-    // Reserved is ignored, as Windows does; only the view bits of samDesired count.
-    LONG code = serve("RegDeleteKeyExW", nullptr,
-                      [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, samDesired); });
-    w32::record("RegDeleteKeyExW", {w32::arg(hKey), w32::arg(lpSubKey), samDesired, Reserved},
-                code);
-    return code;
+    return serve("RegDeleteKeyExW", {arg(hKey), arg(lpSubKey), samDesired, Reserved}, nullptr,
+                 [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, samDesired); });
 }
 
 LSTATUS WINAPI RegDeleteValueW(HKEY hKey, LPCWSTR lpValueName) {
-    LONG code = serve("RegDeleteValueW", nullptr,
-                      [&](Registry& r) { return deleteValue(r, hKey, lpValueName); });
-    w32::record("RegDeleteValueW", {w32::arg(hKey), w32::arg(lpValueName)}, code);
-    return code;
+    return serve("RegDeleteValueW", {arg(hKey), arg(lpValueName)}, nullptr,
+                 [&](Registry& r) { return deleteValue(r, hKey, lpValueName); });
 }
 
 LSTATUS WINAPI RegEnumKeyExW(HKEY hKey, DWORD dwIndex, LPWSTR lpName, LPDWORD lpcchName,
                              LPDWORD lpReserved, LPWSTR lpClass, LPDWORD lpcchClass,
                              PFILETIME lpftLastWriteTime) {
-    LONG code = serve("RegEnumKeyExW", nullptr, [&](Registry& r) {
-        return enumKey(r, hKey, dwIndex, lpName, lpcchName);
-    });
-    w32::record("RegEnumKeyExW",
-                {w32::arg(hKey), dwIndex, w32::arg(lpName), w32::arg(lpcchName),
-                 w32::arg(lpReserved), w32::arg(lpClass), w32::arg(lpcchClass),
-                 w32::arg(lpftLastWriteTime)},
-                code);
-    return code;
+    return serve("RegEnumKeyExW",
+                 {arg(hKey), dwIndex, arg(lpName), arg(lpcchName), arg(lpReserved), arg(lpClass),
+                  arg(lpcchClass), arg(lpftLastWriteTime)},
+                 nullptr,
+                 [&](Registry& r) { return enumKey(r, hKey, dwIndex, lpName, lpcchName); });
 }
 
 LSTATUS WINAPI RegCloseKey(HKEY hKey) {
-    LONG code = serve("RegCloseKey", nullptr, [&](Registry& r) { return closeKey(r, hKey); });
-    w32::record("RegCloseKey", {w32::arg(hKey)}, code);
-    return code;
+    return serve("RegCloseKey", {arg(hKey)}, nullptr,
+                 [&](Registry& r) { return closeKey(r, hKey); });
 }

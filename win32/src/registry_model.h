@@ -48,8 +48,8 @@ struct FoldedOrder {
     }
 };
 
+// Values are found by their folded name; no caller lists them, so their spelling is not kept.
 struct Value {
-    std::u16string name;  // first writer's spelling
     DWORD type = REG_NONE;
     std::vector<BYTE> data;
 };

@@ -7,7 +7,7 @@
 // treats an image with any malformed record as one without resources.
 #pragma once
 
-#include "internal.h"
+#include "byte_cursor.h"
 
 namespace w32 {
 
@@ -21,16 +21,10 @@ constexpr WORD LanguageUsEnglish = 0x0409;
 // The .res image embedded in `instance`, as the resource compiler wrote it; false if it has none.
 bool resourceImage(HINSTANCE instance, const BYTE** data, size_t* size);
 
-// A TYPE or NAME field of a record header: a number, or a text that no numeric lookup matches.
-struct ResourceId {
-    bool isNumber = false;
-    WORD number = 0;
-};
-
 // One resource of an image; `data` points into the image.
 struct ResourceRecord {
-    ResourceId type;
-    ResourceId name;
+    TemplateId type;  // a text matches no numeric lookup
+    TemplateId name;
     WORD language = 0;
     const BYTE* data = nullptr;
     size_t size = 0;

@@ -125,7 +125,8 @@ LRESULT buttonMessage(Window& w, UINT message) {
 bool readLong(HWND handle, int index, void* out, size_t size) {
     Window* w = findOrFail(handle);
     if (!w) return false;
-    if (index < 0 || w->kind != Kind::Dialog || static_cast<size_t>(index) + size > DialogExtraBytes) {
+    bool inSlots = index >= 0 && static_cast<size_t>(index) + size <= DialogExtraBytes;
+    if (w->kind != Kind::Dialog || !inSlots) {
         SetLastError(ERROR_INVALID_INDEX);
         return false;
     }
@@ -198,13 +199,10 @@ HWND WINAPI GetParent(HWND window) {
     return w ? w->parent : nullptr;
 }
 
+// An invalid window's text is empty.
 int WINAPI GetWindowTextW(HWND window, LPWSTR text, int maxCount) {
     Window* w = findOrFail(window);
-    if (!w) {
-        if (text && maxCount > 0) text[0] = 0;
-        return 0;
-    }
-    return copyText(w->text, text, maxCount);
+    return copyText(w ? w->text : std::u16string(), text, maxCount);
 }
 
 int WINAPI GetClassNameW(HWND window, LPWSTR className, int maxCount) {

@@ -68,7 +68,7 @@ std::optional<long> takeFault(std::string_view function) {
     return code;
 }
 
-const bool Plugged = [] {
+[[maybe_unused]] const bool Plugged = [] {
     w32::control.record = record;
     w32::control.takeFault = takeFault;
     w32::control.exportHidden = w32test::exportHidden;

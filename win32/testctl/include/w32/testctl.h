@@ -55,8 +55,6 @@ W32_TEST_API std::vector<HMENU> liveMenus();
 // Every menu object alive, held popups included.
 W32_TEST_API size_t menuObjectCount();
 
-}  // namespace w32test
-
 // ---- Registry test control -------------------------------------------------------------
 // Every registry call is journaled with its arguments in Windows' order, pointers as
 // addresses: RegOpenKeyExW {hKey, lpSubKey, ulOptions, samDesired, phkResult};
@@ -69,7 +67,6 @@ W32_TEST_API size_t menuObjectCount();
 // GetVersionExW {lpVersionInformation}. failCall/failAlways with a registry function's name
 // make it return that code and change nothing (a failed open or create sets *phkResult NULL).
 // Denied rights and hidden exports plug into the layer when this library is loaded.
-namespace w32test {
 
 // An empty registry: the five roots, HKLM\SOFTWARE with Wow6432Node and Classes, and
 // HKCU\Software; every handle closed, no right denied. Also unhides every export and gives
@@ -91,15 +88,12 @@ W32_TEST_API void setVersionFault(bool fail);
 // The dwPlatformId GetVersionExW reports; VER_PLATFORM_WIN32_NT (2) by default.
 W32_TEST_API void setPlatformId(DWORD id);
 
-}  // namespace w32test
-
 // ---- File test control -----------------------------------------------------------------
 // ReadFile and WriteFile are journaled as {hFile, lpBuffer, nNumberOfBytes, lpNumberOfBytes,
 // lpOverlapped} with the BOOL result; CreateFileW as {lpFileName, dwDesiredAccess,
 // dwCreationDisposition} with the handle; CloseHandle as {hObject}. failCall/failAlways with
 // "ReadFile", "WriteFile" or "CreateFileW" make the call fail with that code (last error) and
 // touch nothing: no byte is read or written and the reported count is 0.
-namespace w32test {
 
 // A file handle over an open descriptor (a pipe, a memfd, a temporary file); the handle owns
 // it from now on, and CloseHandle closes it.
@@ -114,15 +108,12 @@ W32_TEST_API void shortRead(unsigned nth, DWORD missing);
 // File handles open now.
 W32_TEST_API size_t openFileCount();
 
-}  // namespace w32test
-
 // ---- Window test control -----------------------------------------------------------------
 // DialogBoxParamW, EndDialog, GetDlgItem, SendMessageW, PostMessageW, the window-long functions,
 // SetTimer and KillTimer are journaled with their arguments in Windows' order; failCall/
 // failAlways("DialogBoxParamW", ...) make it return -1 with that last error and create nothing.
 // A modal loop left with no message and no timer while its dialog is open journals
 // "ModalLoopStalled" {dialog} and makes DialogBoxParamW return -1 (last error ERROR_TIMEOUT).
-namespace w32test {
 
 // Every window alive now (dialogs and their controls).
 W32_TEST_API std::vector<HWND> liveWindows();
