@@ -17,7 +17,7 @@ void walk(HMENU menu, unsigned depth) {
         GetMenuStringW(menu, static_cast<UINT>(i), text, 80, MF_BYPOSITION);
         GetMenuState(menu, static_cast<UINT>(i), MF_BYPOSITION);
         if (HMENU sub = GetSubMenu(menu, i)) {
-            if (depth > w32::menuDepthLimit) __builtin_trap();
+            if (depth > w32::MenuDepthLimit) __builtin_trap();
             walk(sub, depth + 1);
         }
     }

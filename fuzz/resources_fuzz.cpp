@@ -15,16 +15,16 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         // Every record's data must lie inside the image.
         if (record.data < data || record.data + record.size > data + size) __builtin_trap();
     }
-    const WORD types[] = {w32::resourceTypeMenu, w32::resourceTypeDialog,
-                          w32::resourceTypeString, 2, 10};
+    const WORD types[] = {w32::ResourceTypeMenu, w32::ResourceTypeDialog,
+                          w32::ResourceTypeString, 2, 10};
     for (WORD type : types) {
         for (WORD name : {1, 2, 9, 63, 101, 200, 400, 438, 20000}) {
             const BYTE* found = nullptr;
             size_t foundSize = 0;
-            if (w32::lookupResource(data, size, type, name, w32::languageUsEnglish, &found,
-                                    &foundSize) != w32::ResourceStatus::found)
+            if (w32::lookupResource(data, size, type, name, w32::LanguageUsEnglish, &found,
+                                    &foundSize) != w32::ResourceStatus::Found)
                 continue;
-            if (type != w32::resourceTypeString) continue;
+            if (type != w32::ResourceTypeString) continue;
             for (unsigned i = 0; i < 16; ++i) {
                 WORD length = 0;
                 const BYTE* text = w32::blockString(found, foundSize, i, &length);

@@ -42,7 +42,7 @@ inline bool runWineDifferences() {
 
 // Whether calls without a view flag see HKLM\SOFTWARE's 32-bit view: in a 32-bit process, as
 // the shipped module runs, and over the layer, which models that process.
-constexpr bool kDefaultView32 = HV_OVER_LAYER || sizeof(void*) == 4;
+constexpr bool DefaultView32 = HV_OVER_LAYER || sizeof(void*) == 4;
 
 // ASCII text (paths of the build tree) as UTF-16.
 inline WString widen(const std::string& ascii) { return WString(ascii.begin(), ascii.end()); }

@@ -8,7 +8,7 @@ namespace {
 using RegistryKeys = RegistryTest;
 
 TEST_F(RegistryKeys, PredefinedRootsOpenAsThemselvesButCreateNewHandles) {
-    for (HKEY root : {HKEY_CLASSES_ROOT, kUser, kMachine, HKEY_USERS, HKEY_CURRENT_CONFIG}) {
+    for (HKEY root : {HKEY_CLASSES_ROOT, CurrentUser, LocalMachine, HKEY_USERS, HKEY_CURRENT_CONFIG}) {
         HKEY same = nullptr, alsoSame = nullptr;
         EXPECT_EQ(RegOpenKeyExW(root, TEXT(""), 0, KEY_READ, &same), 0);
         EXPECT_EQ(RegOpenKeyExW(root, nullptr, 0, KEY_READ, &alsoSame), 0);

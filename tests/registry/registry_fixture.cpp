@@ -2,8 +2,8 @@
 
 namespace {
 
-const WCHAR kUserBase[] = TEXT("Software\\HiveletConformance");
-const WCHAR kMachineBase[] = TEXT("SOFTWARE\\HiveletConformance");
+const WCHAR UserBase[] = TEXT("Software\\HiveletConformance");
+const WCHAR MachineBase[] = TEXT("SOFTWARE\\HiveletConformance");
 
 WString testName() {
     const ::testing::TestInfo* test = ::testing::UnitTest::GetInstance()->current_test_info();
@@ -24,7 +24,7 @@ LONG deleteTree(HKEY root, const WString& path, REGSAM view) {
         HKEY parent, key;
         WString name;
     };
-    const REGSAM walk = kTreeWalk | view;
+    const REGSAM walk = TreeWalk | view;
     std::vector<Level> stack{{root, nullptr, path}};
     if (LONG code = RegOpenKeyExW(root, path.c_str(), 0, walk, &stack[0].key)) return code;
     while (!stack.empty()) {
@@ -54,12 +54,12 @@ void RegistryTest::SetUp() {
 #endif
     WString name = testName();
     id = TEXT("HiveletConformance ") + name;
-    userPath = kUserBase + (TEXT("\\") + name);
-    machinePath = kMachineBase + (TEXT("\\") + name);
+    userPath = UserBase + (TEXT("\\") + name);
+    machinePath = MachineBase + (TEXT("\\") + name);
     // Left over by a run that did not finish, the scratch keys go first.
-    owned_ = {{kUser, userPath, 0}, {kMachine, machinePath, k32}, {kMachine, machinePath, k64}};
+    owned_ = {{CurrentUser, userPath, 0}, {LocalMachine, machinePath, View32}, {LocalMachine, machinePath, View64}};
     for (const Owned& o : owned_) remove(o.root, o.path, o.view);
-    user = create(kUser, userPath);
+    user = create(CurrentUser, userPath);
 }
 
 void RegistryTest::own(HKEY root, const WString& path, REGSAM view) {
@@ -80,8 +80,8 @@ void RegistryTest::TearDown() {
     RegCloseKey(user);
     for (auto it = owned_.rbegin(); it != owned_.rend(); ++it) remove(it->root, it->path, it->view);
     // The common parents go when the last test that used them is done; until then, 5.
-    RegDeleteKeyW(kUser, kUserBase);
-    for (REGSAM view : {k32, k64}) RegDeleteKeyExW(kMachine, kMachineBase, view, 0);
+    RegDeleteKeyW(CurrentUser, UserBase);
+    for (REGSAM view : {View32, View64}) RegDeleteKeyExW(LocalMachine, MachineBase, view, 0);
 #if HV_OVER_LAYER
     EXPECT_EQ(w32test::openHandleCount(), 0u) << "handles left open";
 #endif

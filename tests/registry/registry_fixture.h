@@ -8,12 +8,12 @@
 #include <string>
 #include <vector>
 
-constexpr BYTE kSentinel = 0xCC;
-constexpr REGSAM kTreeWalk = DELETE | KEY_ENUMERATE_SUB_KEYS;  // 0x10008
-constexpr REGSAM k64 = KEY_WOW64_64KEY;
-constexpr REGSAM k32 = KEY_WOW64_32KEY;
-const HKEY kUser = HKEY_CURRENT_USER;
-const HKEY kMachine = HKEY_LOCAL_MACHINE;
+constexpr BYTE Sentinel = 0xCC;
+constexpr REGSAM TreeWalk = DELETE | KEY_ENUMERATE_SUB_KEYS;  // 0x10008
+constexpr REGSAM View64 = KEY_WOW64_64KEY;
+constexpr REGSAM View32 = KEY_WOW64_32KEY;
+const HKEY CurrentUser = HKEY_CURRENT_USER;
+const HKEY LocalMachine = HKEY_LOCAL_MACHINE;
 
 // Result of RegCreateKeyExW; the handle, if any, is closed again.
 inline LONG tryCreate(HKEY root, const WString& path, REGSAM sam = KEY_ALL_ACCESS,

@@ -24,7 +24,7 @@ TEST_P(RegistryEnumName, WritesTheNameOnlyWithItsTerminator) {
     HKEY key = create(user, TEXT("E"));
     make(key, TEXT("0123456789"));
     WCHAR name[16];
-    std::memset(name, kSentinel, sizeof name);
+    std::memset(name, Sentinel, sizeof name);
     DWORD length = c.capacity;
     EXPECT_EQ(RegEnumKeyExW(key, c.index, name, &length, nullptr, nullptr, nullptr, nullptr),
               c.expected);
@@ -32,7 +32,7 @@ TEST_P(RegistryEnumName, WritesTheNameOnlyWithItsTerminator) {
     EXPECT_EQ(length, ok ? 10 : c.capacity);
     EXPECT_EQ(WString(name, ok ? 11 : 0), ok ? WString(TEXT("0123456789"), 11) : TEXT(""));
     auto* bytes = reinterpret_cast<const BYTE*>(name);
-    for (size_t i = ok ? 22 : 0; i < sizeof name; ++i) ASSERT_EQ(bytes[i], kSentinel) << i;
+    for (size_t i = ok ? 22 : 0; i < sizeof name; ++i) ASSERT_EQ(bytes[i], Sentinel) << i;
     RegCloseKey(key);
 }
 

@@ -10,7 +10,7 @@ protected:
     void SetUp() override {
         RegistryTest::SetUp();
         key = create(user, TEXT("Probe"));
-        buffer.assign(64, kSentinel);
+        buffer.assign(64, Sentinel);
     }
     void TearDown() override {
         RegCloseKey(key);
@@ -24,7 +24,7 @@ protected:
     // Whether the buffer is untouched from byte `from` on.
     ::testing::AssertionResult untouchedFrom(size_t from) {
         for (size_t i = from; i < buffer.size(); ++i)
-            if (buffer[i] != kSentinel) return ::testing::AssertionFailure() << "byte " << i;
+            if (buffer[i] != Sentinel) return ::testing::AssertionFailure() << "byte " << i;
         return ::testing::AssertionSuccess();
     }
     HKEY key = nullptr;

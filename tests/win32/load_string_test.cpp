@@ -7,8 +7,8 @@
 
 namespace {
 
-constexpr DWORD unchanged = 0xBEEF;
-const WCHAR description[] =
+constexpr DWORD Unchanged = 0xBEEF;
+const WCHAR Description[] =
     TEXT("The Hivelet object allows you to retrieve or write values from or to the registry.");
 
 class ModuleResources : public testing::Test {
@@ -20,7 +20,7 @@ protected:
 #if HV_OVER_LAYER
         w32test::reset();
 #endif
-        SetLastError(unchanged);
+        SetLastError(Unchanged);
     }
     static HMODULE module;
 };
@@ -31,7 +31,7 @@ struct Load {
     int capacity;
     int result;
     const WCHAR* text;  // what the buffer starts with; null: the buffer is not written
-    DWORD error = unchanged;
+    DWORD error = Unchanged;
     const char* wineDiffers = nullptr;
 };
 
@@ -52,25 +52,20 @@ TEST_P(LoadStrings, WritesExactlyTheString) {
 
 INSTANTIATE_TEST_SUITE_P(
     Module, LoadStrings,
-    testing::Values(Load{131, 512, 82, description}, Load{1, 64, 3, TEXT("HZ2")},
+    testing::Values(Load{131, 512, 82, Description}, Load{1, 64, 3, TEXT("HZ2")},
                     Load{1005, 64, 19, TEXT("Invalid parameters.")},
                     Load{1005, 20, 19, TEXT("Invalid parameters.")},
                     Load{1005, 19, 18, TEXT("Invalid parameters")},
                     Load{1005, 10, 9, TEXT("Invalid p")},
                     Load{1005, 2, 1, TEXT("I")}, Load{1005, 1, 0, nullptr},
                     Load{0x10000 + 1005, 64, 19, TEXT("Invalid parameters.")},  // ids are 16-bit
-                    Load{1005, -1, 0, nullptr, unchanged,
+                    Load{1005, -1, 0, nullptr, Unchanged,
                          "a negative capacity gives capacity - 1, below the documented range"},
                     Load{133, 64, 0, TEXT("")},  // block 9 exists, entry 133 is empty
                     Load{133, 1, 0, nullptr},
                     Load{3000, 64, 0, nullptr, ERROR_RESOURCE_NAME_NOT_FOUND}));
 
-TEST_F(ModuleResources, CapacityZeroHandsOutAPointerToTheText) {
-    const WCHAR* text = nullptr;
-    EXPECT_EQ(LoadStringW(module, 131, reinterpret_cast<LPWSTR>(&text), 0), 82);
-    ASSERT_NE(text, nullptr);
-    EXPECT_EQ(WString(text, 82), description);
-    EXPECT_EQ(LoadStringW(module, 131, nullptr, 0), 0);
+TEST_F(ModuleResources, ANullBufferGetsNothing) {
     EXPECT_EQ(LoadStringW(module, 131, nullptr, 64), 0);
 }
 

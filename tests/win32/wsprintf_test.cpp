@@ -1,8 +1,8 @@
-// wsprintfW: the conversions a module uses, "(null)" for a null text, and the 1024-character
-// limit with the result Windows gives at it.
+// wsprintfW: the %s field the module uses, "(null)" for a null text, a '%' before anything else,
+// and the 1024-character limit with the result Windows gives at it; and the runtime library's
+// wide-string functions and the last error, which the module and the host use with it.
 #include "pattern_buffer.h"
 
-#include <climits>
 #include <functional>
 
 namespace {
@@ -25,18 +25,10 @@ TEST(Wsprintf, Conversions) {
     } rows[] = {
         {[&] { return formatted(TEXT("Key = %s"), none); }, TEXT("Key = (null)")},
         {[] { return formatted(TEXT("Key = %s"), TEXT("")); }, TEXT("Key = ")},
-        {[] { return formatted(TEXT("%s|%ls"), TEXT("ab"), TEXT("cd")); }, TEXT("ab|cd")},
-        {[] { return formatted(TEXT("%hs"), "narrow"); }, TEXT("narrow")},
-        {[] { return formatted(TEXT("%d %u"), INT_MIN, 0xFFFFFFFFu); },
-         TEXT("-2147483648 4294967295")},
-        {[] { return formatted(TEXT("%x %X %08X"), 0xabc, 0xabc, 0xabc); },
-         TEXT("abc ABC 00000ABC")},
-        {[] { return formatted(TEXT("%lu %ld"), 4000000000u, -5); }, TEXT("4000000000 -5")},
-        {[] { return formatted(TEXT("%c%%"), TEXT('Q')); }, TEXT("Q%")},
-        {[] {
-             return formatted(TEXT("[%5s][%-5s][%.3s]"), TEXT("ab"), TEXT("ab"), TEXT("abcdef"));
-         },
-         TEXT("[   ab][ab   ][abc]")},
+        {[] { return formatted(TEXT("Current Key = %s"), TEXT("A\\B")); },
+         TEXT("Current Key = A\\B")},
+        {[] { return formatted(TEXT("%s|%s"), TEXT("ab"), TEXT("cd")); }, TEXT("ab|cd")},
+        {[] { return formatted(TEXT("%s%%"), TEXT("Q")); }, TEXT("Q%")},
         {[] { return formatted(TEXT("%yz")); }, TEXT("yz")},
         {[] { return formatted(TEXT("100%")); }, TEXT("100")},
     };
@@ -58,13 +50,32 @@ TEST(Wsprintf, LimitOf1024Characters) {
         SCOPED_TRACE(row.length);
         WString text(row.length, TEXT('x'));
         PatternBuffer out;
-        out.chars.resize(3100, PatternBuffer::pattern);
+        out.chars.resize(3100, PatternBuffer::Pattern);
         EXPECT_EQ(wsprintfW(out.data(), TEXT("%s"), text.c_str()), row.result);
         size_t kept = std::min<size_t>(row.length, 1023);
         EXPECT_EQ(WString(out.data()).size(), kept);
         for (size_t i = kept + 1; i < out.chars.size(); ++i)
-            ASSERT_EQ(out.chars[i], PatternBuffer::pattern) << "at " << i;
+            ASSERT_EQ(out.chars[i], PatternBuffer::Pattern) << "at " << i;
     }
+}
+
+TEST(RuntimeText, WideStringFunctions) {
+    WCHAR buffer[6];
+    EXPECT_EQ(wcslen(TEXT("abc")), 3u);
+    EXPECT_EQ(WString(wcscpy(buffer, TEXT("xyz"))), TEXT("xyz"));
+    // wcsncpy pads with zeros up to the count and does not terminate a text it cuts.
+    EXPECT_EQ(WString(wcsncpy(buffer, TEXT("ab"), 5), 5), WString(TEXT("ab\0\0\0"), 5));
+    wcscpy(buffer, TEXT("xyzzy"));
+    EXPECT_EQ(WString(wcsncpy(buffer, TEXT("abcdef"), 3)), TEXT("abczy"));
+    EXPECT_EQ(_wcsicmp(TEXT("HKEY_Users"), TEXT("hkey_users")), 0);
+    EXPECT_LT(_wcsicmp(TEXT("a"), TEXT("B")), 0);
+}
+
+TEST(LastError, KeepsWhatWasSet) {
+    SetLastError(1234);
+    EXPECT_EQ(GetLastError(), 1234u);
+    SetLastError(0);
+    EXPECT_EQ(GetLastError(), 0u);
 }
 
 }  // namespace

@@ -2,7 +2,6 @@
 // the dynamic loader. A library's resources are the compiled resource file that its build
 // embedded as the symbol W32ResourceSection; its entry function is its exported DllMain.
 #include "internal.h"
-#include "registry.h"
 #include "resources.h"
 
 #include <dlfcn.h>
@@ -27,11 +26,10 @@ struct LoadedLibrary {
 std::mutex libraryLock;
 std::map<void*, LoadedLibrary*> loaded;  // by dlopen handle, so a second load shares the first
 
-// System DLL names a module may load; their functions are this layer's own.
+// The system library the module loads; its functions are this layer's own.
 bool isSystemLibrary(std::string name) {
     for (char& c : name) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
-    return name == "advapi32.dll" || name == "advapi32" || name == "kernel32.dll" ||
-           name == "kernel32" || name == "user32.dll" || name == "user32";
+    return name == "advapi32.dll" || name == "advapi32";
 }
 
 void* layerHandle() {
@@ -42,11 +40,35 @@ void* layerHandle() {
 
 typedef BOOL(WINAPI* EntryFunction)(HINSTANCE, DWORD, LPVOID);
 
+// Registers a library the dynamic loader has opened and runs its entry function the first time.
+LoadedLibrary* attach(void* dl, bool system) {
+    std::lock_guard<std::mutex> guard(libraryLock);
+    auto found = loaded.find(dl);
+    if (found != loaded.end()) {
+        dlclose(dl);  // the dynamic loader counted this open too
+        ++found->second->references;
+        return found->second;
+    }
+    auto* image = static_cast<const BYTE*>(dlsym(dl, "W32ResourceSection"));
+    auto* imageSize = static_cast<const size_t*>(dlsym(dl, "W32ResourceSectionSize"));
+    auto* lib = new LoadedLibrary{dl, system, 1, image, imageSize ? *imageSize : 0};
+    void* entry = system ? nullptr : dlsym(dl, "DllMain");
+    if (entry && !reinterpret_cast<EntryFunction>(entry)(reinterpret_cast<HINSTANCE>(lib),
+                                                         DLL_PROCESS_ATTACH, nullptr)) {
+        dlclose(dl);
+        delete lib;
+        SetLastError(ERROR_DLL_INIT_FAILED);
+        return nullptr;
+    }
+    loaded[dl] = lib;
+    return lib;
+}
+
 }  // namespace
 
-static LoadedLibrary* attach(void* dl, bool system);
-
 namespace w32 {
+
+Control control;
 
 std::string toUtf8(const WCHAR* text) {
     std::string out;
@@ -95,8 +117,6 @@ HMODULE WINAPI LoadLibraryW(LPCWSTR fileName) {
     LoadedLibrary* lib = nullptr;
     if (auto code = w32::takeFault("LoadLibraryW")) {
         SetLastError(static_cast<DWORD>(*code));
-    } else if (!fileName) {
-        SetLastError(ERROR_INVALID_PARAMETER);
     } else if (void* dl = system ? layerHandle() : dlopen(name.c_str(), RTLD_NOW | RTLD_LOCAL)) {
         lib = attach(dl, system);
     } else {
@@ -106,35 +126,6 @@ HMODULE WINAPI LoadLibraryW(LPCWSTR fileName) {
     return reinterpret_cast<HMODULE>(lib);
 }
 
-// Registers a library the dynamic loader has opened and runs its entry function the first time.
-static LoadedLibrary* attach(void* dl, bool system) {
-    std::lock_guard<std::mutex> guard(libraryLock);
-    auto found = loaded.find(dl);
-    if (found != loaded.end()) {
-        dlclose(dl);  // the dynamic loader counted this open too
-        ++found->second->references;
-        return found->second;
-    }
-    LoadedLibrary* lib = nullptr;
-    {
-        auto* image = static_cast<const BYTE*>(dlsym(dl, "W32ResourceSection"));
-        auto* imageSize = static_cast<const size_t*>(dlsym(dl, "W32ResourceSectionSize"));
-        lib = new LoadedLibrary{dl, system, 1, image, imageSize ? *imageSize : 0};
-        void* entry = system ? nullptr : dlsym(dl, "DllMain");
-        if (entry &&
-            !reinterpret_cast<EntryFunction>(entry)(reinterpret_cast<HINSTANCE>(lib),
-                                                    DLL_PROCESS_ATTACH, nullptr)) {
-            dlclose(dl);
-            delete lib;
-            lib = nullptr;
-            SetLastError(1114);  // ERROR_DLL_INIT_FAILED
-            return nullptr;
-        }
-    }
-    loaded[dl] = lib;
-    return lib;
-}
-
 FARPROC WINAPI GetProcAddress(HMODULE module, LPCSTR procName) {
     auto* lib = reinterpret_cast<LoadedLibrary*>(module);
     void* symbol = nullptr;
@@ -142,7 +133,7 @@ FARPROC WINAPI GetProcAddress(HMODULE module, LPCSTR procName) {
         SetLastError(static_cast<DWORD>(*code));
     } else if (!lib || !procName) {
         SetLastError(ERROR_INVALID_HANDLE);
-    } else if (lib->system && w32::exportHidden(procName)) {
+    } else if (lib->system && w32::control.exportHidden && w32::control.exportHidden(procName)) {
         SetLastError(ERROR_PROC_NOT_FOUND);  // a test made the system library lack it
     } else if (!(symbol = dlsym(lib->dl, procName))) {
         SetLastError(ERROR_PROC_NOT_FOUND);

@@ -1,53 +1,23 @@
-// Menus: LoadMenuW over the compiled menu templates, the popup functions the module's event
-// menus use, and the test control that lists the menus still alive.
+// Menus: LoadMenuW over the compiled menu templates and the popup functions the module's event
+// menus use.
 #include "menus.h"
 
 #include <cstring>
-#include <map>
-#include <memory>
-#include <mutex>
 
-#include "internal.h"
+#include "byte_cursor.h"
 #include "resources.h"
+
+using namespace w32;
 
 namespace {
 
-struct Item {
-    UINT flags = 0;  // type and state bits as GetMenuState reports them; MF_POPUP for a popup
-    UINT id = 0;
-    HMENU popup = nullptr;
-    bool hasText = false;
-    std::u16string text;
-};
+using Guard = MenuGuard;
+using Item = MenuItem;
 
-struct Menu {
-    bool isPopup = false;
-    HMENU owner = nullptr;  // the menu whose popup item holds this one, if any
-    std::vector<Item> items;
-};
-
-// The bits of AppendMenuW's flags that an item keeps; the others say how to find an item.
-constexpr UINT keptFlags = MF_GRAYED | MF_DISABLED | MF_BITMAP | MF_CHECKED | MF_POPUP |
-                           MF_MENUBARBREAK | MF_MENUBREAK | MF_HILITE | MF_OWNERDRAW |
-                           MF_SEPARATOR | MF_DEFAULT | MF_HELP;
-
-struct Menus {
-    std::recursive_mutex lock;
-    std::map<HMENU, Menu> alive;
-    uintptr_t next = 0x10000;  // handles are never reused, so a stale one stays invalid
-};
-
-Menus& menus() {
-    static Menus* m = new Menus;  // never destroyed: menus may be released during exit
-    return *m;
-}
-
-using Guard = std::lock_guard<std::recursive_mutex>;
-
-HMENU newMenu(Menus& m, bool isPopup) {
+HMENU newMenu(Menus& m) {
     auto handle = reinterpret_cast<HMENU>(m.next);
     m.next += 4;
-    m.alive[handle].isPopup = isPopup;
+    m.alive[handle];
     return handle;
 }
 
@@ -66,75 +36,56 @@ void destroy(Menus& m, HMENU handle) {
 }
 
 // The item at `item` in `menu`, by position or by command identifier (searched through nested
-// popups, the first match in item order); `holder` receives the menu that holds it.
-Item* locate(Menus& m, Menu& menu, UINT item, UINT flags, Menu** holder, unsigned depth = 0) {
-    if (flags & MF_BYPOSITION) {
-        if (item >= menu.items.size()) return nullptr;
-        *holder = &menu;
-        return &menu.items[item];
-    }
+// popups, the first match in item order).
+Item* locate(Menus& m, Menu& menu, UINT item, UINT flags, unsigned depth = 0) {
+    if (flags & MF_BYPOSITION) return item < menu.items.size() ? &menu.items[item] : nullptr;
     for (Item& candidate : menu.items) {
-        if (!candidate.popup && !(candidate.flags & MF_SEPARATOR) && candidate.id == item) {
-            *holder = &menu;
+        if (!candidate.popup && !(candidate.flags & MF_SEPARATOR) && candidate.id == item)
             return &candidate;
-        }
-        if (candidate.popup && depth < w32::menuDepthLimit) {
+        if (candidate.popup && depth < MenuDepthLimit) {
             if (Menu* sub = find(m, candidate.popup))
-                if (Item* found = locate(m, *sub, item, flags, holder, depth + 1)) return found;
+                if (Item* found = locate(m, *sub, item, flags, depth + 1)) return found;
         }
     }
     return nullptr;
 }
 
+// The item at `position` of a menu, if both are there.
+const Item* itemAt(Menus& m, HMENU handle, int position) {
+    Menu* menu = find(m, handle);
+    return position >= 0 && menu ? locate(m, *menu, static_cast<UINT>(position), MF_BYPOSITION)
+                                 : nullptr;
+}
+
 // Reads a standard menu template into `menu`, one level at a time.
 class TemplateReader {
 public:
-    TemplateReader(Menus& m, const BYTE* data, size_t size) : m_(m), data_(data), size_(size) {}
+    TemplateReader(Menus& m, const BYTE* data, size_t size) : m_(m), c_(data, size) {}
 
     bool read(HMENU menu) {
-        if (size_ < 4) return false;
-        WORD version = word(0), offset = word(2);
+        WORD version = 0, offset = 0;
+        if (!c_.word(&version) || !c_.word(&offset)) return false;
         if (version != 0) return false;  // extended templates are not supported
-        at_ = 4 + size_t{offset};
-        return level(menu, 0);
+        return c_.skip(offset) && level(menu, 0);
     }
 
 private:
     Menus& m_;
-    const BYTE* data_;
-    size_t size_;
-    size_t at_ = 0;
-
-    WORD word(size_t at) const { return static_cast<WORD>(data_[at] | (data_[at + 1] << 8)); }
-
-    bool readWord(WORD* value) {
-        if (at_ > size_ || size_ - at_ < 2) return false;
-        *value = word(at_);
-        at_ += 2;
-        return true;
-    }
-
-    bool readText(std::u16string* text) {
-        for (WORD c = 0;;) {
-            if (!readWord(&c)) return false;
-            if (c == 0) return true;
-            text->push_back(static_cast<char16_t>(c));
-        }
-    }
+    Cursor c_;
 
     bool level(HMENU handle, unsigned depth) {
-        if (depth > w32::menuDepthLimit) return false;
+        if (depth > MenuDepthLimit) return false;
         for (;;) {
             WORD option = 0, id = 0;
             Item item;
-            if (!readWord(&option)) return false;
-            if (!(option & MF_POPUP) && !readWord(&id)) return false;
-            if (!readText(&item.text)) return false;
+            if (!c_.word(&option)) return false;
+            if (!(option & MF_POPUP) && !c_.word(&id)) return false;
+            if (!c_.text(&item.text)) return false;
             item.hasText = true;
             item.id = id;
-            item.flags = option & keptFlags & ~MF_HILITE;
+            item.flags = option & MF_POPUP;
             if (option & MF_POPUP) {
-                item.popup = newMenu(m_, true);
+                item.popup = newMenu(m_);
                 m_.alive[item.popup].owner = handle;
                 // The popup joins its menu first, so that a failure below releases it too.
                 m_.alive[handle].items.push_back(item);
@@ -158,53 +109,40 @@ T failWith(long code, T result) {
 }
 
 HMENU loadMenu(HINSTANCE instance, LPCWSTR name) {
-    if (auto code = w32::takeFault("LoadMenuW")) return failWith<HMENU>(*code, nullptr);
+    if (auto code = takeFault("LoadMenuW")) return failWith<HMENU>(*code, nullptr);
     // Only numbered menus exist in the images the layer reads.
-    if (reinterpret_cast<uintptr_t>(name) >> 16) return failWith<HMENU>(1814, nullptr);
+    if (!IS_INTRESOURCE(name)) return failWith<HMENU>(ERROR_RESOURCE_NAME_NOT_FOUND, nullptr);
     const BYTE* data = nullptr;
     size_t size = 0;
     auto number = static_cast<WORD>(reinterpret_cast<uintptr_t>(name));
-    if (!w32::findResource(instance, w32::resourceTypeMenu, number, w32::languageUsEnglish, &data,
-                           &size))
+    if (!findResource(instance, ResourceTypeMenu, number, LanguageUsEnglish, &data, &size))
         return nullptr;
-    HMENU menu = w32::menuFromTemplate(data, size);
-    if (!menu) SetLastError(1812);
+    HMENU menu = menuFromTemplate(data, size);
+    if (!menu) SetLastError(ERROR_RESOURCE_DATA_NOT_FOUND);
     return menu;
 }
 
-HMENU createMenu(const char* function, bool isPopup) {
-    if (auto code = w32::takeFault(function)) return failWith<HMENU>(*code, nullptr);
-    Menus& m = menus();
-    Guard guard(m.lock);
-    return newMenu(m, isPopup);
-}
-
 BOOL appendMenu(HMENU handle, UINT flags, UINT_PTR idNewItem, LPCWSTR text) {
-    if (auto code = w32::takeFault("AppendMenuW")) return failWith<BOOL>(*code, FALSE);
+    if (auto code = takeFault("AppendMenuW")) return failWith<BOOL>(*code, FALSE);
     Menus& m = menus();
     Guard guard(m.lock);
     Menu* menu = find(m, handle);
     if (!menu) return failWith<BOOL>(ERROR_INVALID_MENU_HANDLE, FALSE);
     Item item;
-    item.flags = flags & keptFlags;
+    item.flags = flags & (MF_POPUP | MF_SEPARATOR);
     if (flags & MF_POPUP) {
         auto popup = reinterpret_cast<HMENU>(idNewItem);
         Menu* sub = find(m, popup);
         if (!sub || popup == handle) return failWith<BOOL>(ERROR_INVALID_MENU_HANDLE, FALSE);
         item.popup = popup;
         sub->owner = handle;
-        sub->isPopup = true;
         menu = find(m, handle);
     } else {
         item.id = static_cast<UINT>(idNewItem);
     }
-    if (!(flags & (MF_SEPARATOR | MF_BITMAP | MF_OWNERDRAW))) {
-        if (text) {
-            item.hasText = true;
-            item.text = text;
-        } else if (!(flags & MF_POPUP)) {
-            item.flags |= MF_SEPARATOR;  // a string item without a text shows as a separator
-        }
+    if (!(flags & MF_SEPARATOR) && text) {
+        item.hasText = true;
+        item.text = text;
     }
     menu->items.push_back(std::move(item));
     return TRUE;
@@ -217,8 +155,7 @@ int menuString(HMENU handle, UINT item, LPWSTR buffer, int bufferMax, UINT flags
     Guard guard(m.lock);
     Menu* menu = find(m, handle);
     if (!menu) return failWith(ERROR_INVALID_MENU_HANDLE, 0);
-    Menu* holder = nullptr;
-    Item* found = locate(m, *menu, item, flags, &holder);
+    Item* found = locate(m, *menu, item, flags);
     if (!found) return failWith(ERROR_MENU_ITEM_NOT_FOUND, 0);
     if (buffer && bufferMax > 0) buffer[0] = 0;
     if (!found->hasText) return 0;
@@ -235,8 +172,7 @@ UINT menuState(HMENU handle, UINT item, UINT flags) {
     Guard guard(m.lock);
     Menu* menu = find(m, handle);
     if (!menu) return failWith(ERROR_INVALID_MENU_HANDLE, ~0u);
-    Menu* holder = nullptr;
-    Item* found = locate(m, *menu, item, flags, &holder);
+    Item* found = locate(m, *menu, item, flags);
     if (!found) return ~0u;
     if (found->popup) {
         // A popup reports its item count in the high byte and its flags in the low one.
@@ -249,34 +185,36 @@ UINT menuState(HMENU handle, UINT item, UINT flags) {
 
 }  // namespace
 
-namespace w32 {
+Menus& w32::menus() {
+    static Menus* m = new Menus;  // never destroyed: menus may be released during exit
+    return *m;
+}
 
-HMENU menuFromTemplate(const BYTE* data, size_t size) {
+HMENU w32::menuFromTemplate(const BYTE* data, size_t size) {
     Menus& m = menus();
     Guard guard(m.lock);
-    HMENU menu = newMenu(m, false);
+    HMENU menu = newMenu(m);
     if (TemplateReader(m, data, size).read(menu)) return menu;
     destroy(m, menu);
     return nullptr;
 }
 
-}  // namespace w32
-
 HMENU WINAPI LoadMenuW(HINSTANCE instance, LPCWSTR name) {
     HMENU result = loadMenu(instance, name);
-    w32::record("LoadMenuW", {w32::arg(instance), w32::arg(name)}, w32::arg(result));
+    record("LoadMenuW", {arg(instance), arg(name)}, arg(result));
     return result;
 }
 
 HMENU WINAPI CreatePopupMenu(void) {
-    HMENU result = createMenu("CreatePopupMenu", true);
-    w32::record("CreatePopupMenu", {}, w32::arg(result));
-    return result;
-}
-
-HMENU WINAPI CreateMenu(void) {
-    HMENU result = createMenu("CreateMenu", false);
-    w32::record("CreateMenu", {}, w32::arg(result));
+    HMENU result = nullptr;
+    if (auto code = takeFault("CreatePopupMenu")) {
+        SetLastError(static_cast<DWORD>(*code));
+    } else {
+        Menus& m = menus();
+        Guard guard(m.lock);
+        result = newMenu(m);
+    }
+    record("CreatePopupMenu", {}, arg(result));
     return result;
 }
 
@@ -292,14 +230,8 @@ BOOL WINAPI DestroyMenu(HMENU handle) {
             SetLastError(ERROR_INVALID_MENU_HANDLE);
         }
     }
-    w32::record("DestroyMenu", {w32::arg(handle)}, result);
+    record("DestroyMenu", {arg(handle)}, result);
     return result;
-}
-
-BOOL WINAPI IsMenu(HMENU handle) {
-    Menus& m = menus();
-    Guard guard(m.lock);
-    return find(m, handle) != nullptr;
 }
 
 HMENU WINAPI GetSubMenu(HMENU handle, int position) {
@@ -307,11 +239,9 @@ HMENU WINAPI GetSubMenu(HMENU handle, int position) {
     {
         Menus& m = menus();
         Guard guard(m.lock);
-        Menu* menu = find(m, handle);
-        if (menu && position >= 0 && static_cast<size_t>(position) < menu->items.size())
-            result = menu->items[static_cast<size_t>(position)].popup;
+        if (const Item* item = itemAt(m, handle, position)) result = item->popup;
     }
-    w32::record("GetSubMenu", {w32::arg(handle), w32::arg(position)}, w32::arg(result));
+    record("GetSubMenu", {arg(handle), arg(position)}, arg(result));
     return result;
 }
 
@@ -325,7 +255,7 @@ int WINAPI GetMenuItemCount(HMENU handle) {
         else
             SetLastError(ERROR_INVALID_MENU_HANDLE);
     }
-    w32::record("GetMenuItemCount", {w32::arg(handle)}, result);
+    record("GetMenuItemCount", {arg(handle)}, result);
     return result;
 }
 
@@ -334,56 +264,27 @@ UINT WINAPI GetMenuItemID(HMENU handle, int position) {
     {
         Menus& m = menus();
         Guard guard(m.lock);
-        Menu* menu = find(m, handle);
-        if (menu && position >= 0 && static_cast<size_t>(position) < menu->items.size()) {
-            const Item& item = menu->items[static_cast<size_t>(position)];
-            if (!item.popup) result = item.id;
-        }
+        const Item* item = itemAt(m, handle, position);
+        if (item && !item->popup) result = item->id;
     }
-    w32::record("GetMenuItemID", {w32::arg(handle), w32::arg(position)}, result);
+    record("GetMenuItemID", {arg(handle), arg(position)}, result);
     return result;
 }
 
 int WINAPI GetMenuStringW(HMENU handle, UINT item, LPWSTR buffer, int bufferMax, UINT flags) {
     int result = menuString(handle, item, buffer, bufferMax, flags);
-    w32::record("GetMenuStringW",
-                {w32::arg(handle), item, w32::arg(buffer), w32::arg(bufferMax), flags}, result);
+    record("GetMenuStringW", {arg(handle), item, arg(buffer), arg(bufferMax), flags}, result);
     return result;
 }
 
 UINT WINAPI GetMenuState(HMENU handle, UINT item, UINT flags) {
     UINT result = menuState(handle, item, flags);
-    w32::record("GetMenuState", {w32::arg(handle), item, flags}, result);
+    record("GetMenuState", {arg(handle), item, flags}, result);
     return result;
 }
 
 BOOL WINAPI AppendMenuW(HMENU handle, UINT flags, UINT_PTR idNewItem, LPCWSTR text) {
     BOOL result = appendMenu(handle, flags, idNewItem, text);
-    w32::record("AppendMenuW", {w32::arg(handle), flags, idNewItem, w32::arg(text)}, result);
+    record("AppendMenuW", {arg(handle), flags, idNewItem, arg(text)}, result);
     return result;
 }
-
-namespace w32test {
-
-std::vector<HMENU> liveMenus() {
-    Menus& m = menus();
-    Guard guard(m.lock);
-    std::vector<HMENU> roots;
-    for (const auto& [handle, menu] : m.alive)
-        if (!menu.owner || !find(m, menu.owner)) roots.push_back(handle);
-    return roots;
-}
-
-size_t menuObjectCount() {
-    Menus& m = menus();
-    Guard guard(m.lock);
-    return m.alive.size();
-}
-
-void resetMenus() {
-    Menus& m = menus();
-    Guard guard(m.lock);
-    m.alive.clear();
-}
-
-}  // namespace w32test

@@ -2,17 +2,13 @@
 // registry functions, the module and this layer produce.
 #include "internal.h"
 
-#include <algorithm>
 #include <string>
-#include <string_view>
 
 namespace {
 
-constexpr DWORD sourceFlags =
-    FORMAT_MESSAGE_FROM_STRING | FORMAT_MESSAGE_FROM_HMODULE | FORMAT_MESSAGE_FROM_SYSTEM;
-constexpr DWORD lineBreaksDropped = FORMAT_MESSAGE_MAX_WIDTH_MASK;
-// What Windows reports for a language whose message file is not installed; only English is.
-constexpr DWORD errorMuiFileNotFound = 15100;
+// The one way the module and the host call it: a system message, inserts left as they are, in
+// the default language, into the caller's buffer.
+constexpr DWORD ServedFlags = FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS;
 
 struct SystemMessage {
     DWORD code;
@@ -20,7 +16,7 @@ struct SystemMessage {
 };
 
 // Texts of Windows 7 (code 8 was reworded in later versions).
-constexpr SystemMessage systemMessages[] = {
+constexpr SystemMessage SystemMessages[] = {
     {0, u"The operation completed successfully."},
     {2, u"The system cannot find the file specified."},
     {3, u"The system cannot find the path specified."},
@@ -65,44 +61,14 @@ constexpr SystemMessage systemMessages[] = {
     {1813, u"The specified resource type cannot be found in the image file."},
     {1814, u"The specified resource name cannot be found in the image file."},
     {1815, u"The specified resource language ID cannot be found in the image file."},
-    {errorMuiFileNotFound, u"The resource loader failed to find MUI file."},
 };
 
 const char16_t* systemText(DWORD code) {
     // HRESULTs of the Win32 facility carry a system code in their low word.
     if ((code & 0xFFFF0000) == 0x80070000) code &= 0xFFFF;
-    for (const SystemMessage& message : systemMessages)
+    for (const SystemMessage& message : SystemMessages)
         if (message.code == code) return message.text;
     return nullptr;
-}
-
-// Language 0 lets the system choose; the user and system defaults are English here too.
-bool isEnglish(DWORD language) {
-    return language == 0 || language == 0x0409 || language == 0x0400 || language == 0x0800;
-}
-
-bool hasInserts(const char16_t* text) {
-    for (; *text; ++text)
-        if (*text == u'%') return true;
-    return false;
-}
-
-// The message as stored, ending in CR LF. A maximum width turns that line break into a space
-// and breaks the lines at spaces so that none is longer than the width; 0xFF sets no width.
-std::u16string messageText(const char16_t* text, DWORD flags) {
-    DWORD width = flags & FORMAT_MESSAGE_MAX_WIDTH_MASK;
-    if (width == 0) return std::u16string(text) + u"\r\n";
-    std::u16string out;
-    size_t line = 0;  // characters on the output line so far
-    for (std::u16string_view rest = text; !rest.empty();) {
-        std::u16string_view word = rest.substr(0, rest.find(u' '));
-        rest.remove_prefix(std::min(rest.size(), word.size() + 1));
-        bool wrap = line > 0 && width != lineBreaksDropped && line + 1 + word.size() > width;
-        out += line == 0 ? u"" : wrap ? u"\r\n" : u" ";
-        line = (wrap ? 0 : line + (line > 0)) + word.size();
-        out += word;
-    }
-    return out + u" ";
 }
 
 // Fails the call with `code`; returns FormatMessageW's failure result.
@@ -124,18 +90,12 @@ DWORD store(const std::u16string& text, LPWSTR buffer, DWORD size) {
 
 DWORD formatMessage(DWORD flags, DWORD messageId, DWORD languageId, LPWSTR buffer, DWORD size) {
     if (auto code = w32::takeFault("FormatMessageW")) return failWith(static_cast<DWORD>(*code));
-    // Only system messages are served; an allocated buffer would need LocalFree, which the
-    // layer does not offer.
-    if ((flags & sourceFlags) != FORMAT_MESSAGE_FROM_SYSTEM ||
-        (flags & FORMAT_MESSAGE_ALLOCATE_BUFFER) || !buffer)
+    if (flags != ServedFlags || languageId != 0 || !buffer)
         return failWith(ERROR_INVALID_PARAMETER);
-    if (!isEnglish(languageId)) return failWith(errorMuiFileNotFound);
     const char16_t* text = systemText(messageId);
     if (!text) return failWith(ERROR_MR_MID_NOT_FOUND);
-    // Inserts are only passed through; filling them in from arguments is not supported.
-    if (!(flags & FORMAT_MESSAGE_IGNORE_INSERTS) && hasInserts(text))
-        return failWith(ERROR_INVALID_PARAMETER);
-    return store(messageText(text, flags), buffer, size);
+    // Every message ends in CR LF.
+    return store(std::u16string(text) + u"\r\n", buffer, size);
 }
 
 }  // namespace

@@ -5,12 +5,11 @@
 #include <new>
 
 using namespace w32::reg;
+using w32::arg;
 
 namespace {
 
 bool isEmptyPath(const WCHAR* path) { return !path || !path[0]; }
-
-bool bothViews(REGSAM sam) { return (sam & kViewBits) == kViewBits; }
 
 std::u16string_view valueName(const WCHAR* name) {
     return name ? std::u16string_view(name) : std::u16string_view();
@@ -19,7 +18,7 @@ std::u16string_view valueName(const WCHAR* name) {
 // Runs one registry call: an injected fault answers first and touches nothing but the out
 // handle; otherwise the call runs under the registry's lock and running out of memory is a code.
 template <typename Body>
-LONG serve(std::string_view function, HKEY* outHandle, Body body) {
+LONG run(std::string_view function, HKEY* outHandle, Body body) {
     if (auto code = w32::takeFault(function)) {
         if (outHandle) *outHandle = nullptr;
         return static_cast<LONG>(*code);
@@ -33,24 +32,36 @@ LONG serve(std::string_view function, HKEY* outHandle, Body body) {
     }
 }
 
-// A new handle to `key` if the key grants what `sam` asks for.
+// Runs the call and journals it with its arguments, in Windows' order.
+template <typename Body>
+LONG serve(std::string_view function, std::initializer_list<uint64_t> args, HKEY* outHandle,
+           Body body) {
+    LONG code = run(function, outHandle, body);
+    w32::record(function, args, code);
+    return code;
+}
+
+// A new handle to `key` if the key grants what `sam` asks for (the view bits ask for nothing).
 LONG grant(Registry& r, Key& key, REGSAM sam, HKEY* out) {
-    DWORD rights = requestedRights(sam, key.denied);
+    DWORD rights = sam & KEY_ALL_ACCESS;
     if (rights & key.denied) return ERROR_ACCESS_DENIED;
     *out = addHandle(r, key, rights);
     return ERROR_SUCCESS;
 }
 
 // The checks open, create and delete make on the start key and the path, in Windows' order;
-// `names` receives the path's components.
-LONG startWalk(const Bound& start, const WCHAR* path, Names& names) {
+// `way` receives the walk the path takes in the view of `sam`.
+LONG startWalk(Registry& r, const Bound& start, const WCHAR* path, REGSAM sam, Route& way) {
     if (LONG code = checkLeading(path, start)) return code;
     if (start.key->deleted) return ERROR_KEY_DELETED;
-    return splitPath(path, names);
+    Names names;
+    if (LONG code = splitPath(path, names)) return code;
+    way = route(r, *start.key, names, sam);
+    return ERROR_SUCCESS;
 }
 
 LONG openKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam, HKEY* out) {
-    if (!out || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    if (!out) return ERROR_INVALID_PARAMETER;
     Bound start;
     if (LONG code = bind(r, parent, start)) return code;  // *out untouched, as on Windows
     // "" or NULL on a predefined root hands back the predefined value itself.
@@ -59,26 +70,24 @@ LONG openKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam, HKEY* out)
         return ERROR_SUCCESS;
     }
     *out = nullptr;
-    Names names;
-    if (LONG code = startWalk(start, path, names)) return code;
-    Route way = route(r, *start.key, names, sam);
+    Route way;
+    if (LONG code = startWalk(r, start, path, sam, way)) return code;
     Key* key = findKey(*way.from, way.names);
     if (!key) return ERROR_FILE_NOT_FOUND;
     return grant(r, *key, sam, out);
 }
 
-LONG createKey(Registry& r, HKEY parent, const WCHAR* path, DWORD reserved, REGSAM sam,
-               HKEY* out, DWORD* disposition) {
+LONG createKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam, HKEY* out,
+               DWORD* disposition) {
     // A NULL out pointer: Windows' answer is recorded nowhere and Wine crashes (both process
     // kinds); 87, as RegOpenKeyExW answers.
-    if (!out || reserved || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    if (!out) return ERROR_INVALID_PARAMETER;
     Bound start;
     if (LONG code = bind(r, parent, start)) return code;
     *out = nullptr;
     // A NULL path, documented as not allowed, names the key itself as "" does (Wine: 0).
-    Names names;
-    if (LONG code = startWalk(start, path, names)) return code;
-    Route way = route(r, *start.key, names, sam);
+    Route way;
+    if (LONG code = startWalk(r, start, path, sam, way)) return code;
     Key* key = nullptr;
     bool created = false;
     if (LONG code = createPath(*way.from, way.names, key, created)) return code;
@@ -89,13 +98,12 @@ LONG createKey(Registry& r, HKEY parent, const WCHAR* path, DWORD reserved, REGS
 }
 
 LONG deleteKey(Registry& r, HKEY parent, const WCHAR* path, REGSAM sam) {
-    if (!path || bothViews(sam)) return ERROR_INVALID_PARAMETER;
+    if (!path) return ERROR_INVALID_PARAMETER;
     Bound start;
     if (LONG code = bind(r, parent, start)) return code;
-    Names names;
-    if (LONG code = startWalk(start, path, names)) return code;
     // The parent handle's rights do not matter: Windows opens the subkey itself with DELETE.
-    Route way = route(r, *start.key, names, sam);
+    Route way;
+    if (LONG code = startWalk(r, start, path, sam, way)) return code;
     Key* key = findKey(*way.from, way.names);
     return key ? removeKey(*key) : ERROR_FILE_NOT_FOUND;
 }
@@ -118,12 +126,11 @@ LONG setValue(Registry& r, HKEY handle, const WCHAR* name, DWORD type, const BYT
     Bound at;
     if (LONG code = bindFor(r, handle, KEY_SET_VALUE, at)) return code;
     std::u16string_view label = valueName(name);
-    if (label.size() > kMaxValueNameLength) return ERROR_INVALID_PARAMETER;
-    if (!data && size) return ERROR_NOACCESS;
+    if (label.size() > MaxValueNameLength) return ERROR_INVALID_PARAMETER;
     if (data) size = storedSize(type, data, size);
     auto found = at.key->values.find(RawName{label});
-    if (found == at.key->values.end())  // a new value; an existing one keeps its first spelling
-        found = at.key->values.emplace(fold(label), Value{std::u16string(label)}).first;
+    if (found == at.key->values.end())
+        found = at.key->values.emplace(fold(label), Value()).first;
     Value& value = found->second;
     value.type = type;
     value.data.clear();
@@ -142,9 +149,8 @@ void terminate(const Value& value, BYTE* data, DWORD capacity) {
     data[n] = data[n + 1] = 0;
 }
 
-LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* reserved, DWORD* type,
-                BYTE* data, DWORD* size) {
-    if (reserved || (data && !size)) return ERROR_INVALID_PARAMETER;
+LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* type, BYTE* data,
+                DWORD* size) {
     Bound at;
     if (LONG code = bindFor(r, handle, KEY_QUERY_VALUE, at)) return code;
     auto it = at.key->values.find(RawName{valueName(name)});
@@ -176,34 +182,17 @@ LONG deleteValue(Registry& r, HKEY handle, const WCHAR* name) {
     return ERROR_SUCCESS;
 }
 
-// Keys have no class here: a class buffer receives an empty string.
-LONG emptyClass(WCHAR* cls, DWORD* length) {
-    if (!cls) return ERROR_SUCCESS;
-    if (!length) return ERROR_INVALID_PARAMETER;
-    if (*length < 1) return ERROR_MORE_DATA;
-    cls[0] = 0;
-    *length = 0;
-    return ERROR_SUCCESS;
-}
-
-LONG enumKey(Registry& r, HKEY handle, DWORD index, WCHAR* name, DWORD* length, DWORD* reserved,
-             WCHAR* cls, DWORD* classLength, FILETIME* written) {
-    // NULL name or length: Windows' answer is recorded nowhere and Wine crashes; 87 here.
-    if (reserved || !name || !length) return ERROR_INVALID_PARAMETER;
+// Only the name is served: callers ask for no class and no time of the last write.
+LONG enumKey(Registry& r, HKEY handle, DWORD index, WCHAR* name, DWORD* length) {
     Bound at;
     if (LONG code = bindFor(r, handle, KEY_ENUMERATE_SUB_KEYS, at)) return code;
     const Key* child = childAt(*at.key, index);
     if (!child) return ERROR_NO_MORE_ITEMS;
     // The name must fit with its terminator; if not, neither buffer nor count is written.
     if (*length <= child->name.size()) return ERROR_MORE_DATA;
-    if (LONG code = emptyClass(cls, classLength)) return code;
     std::memcpy(name, child->name.data(), child->name.size() * sizeof(WCHAR));
     name[child->name.size()] = 0;
     *length = static_cast<DWORD>(child->name.size());
-    if (written) {
-        written->dwLowDateTime = static_cast<DWORD>(child->lastWrite);
-        written->dwHighDateTime = static_cast<DWORD>(child->lastWrite >> 32);
-    }
     return ERROR_SUCCESS;
 }
 
@@ -220,96 +209,71 @@ LONG closeKey(Registry& r, HKEY handle) {
 
 LSTATUS WINAPI RegOpenKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD ulOptions, REGSAM samDesired,
                              PHKEY phkResult) {
-    LONG code = serve("RegOpenKeyExW", phkResult, [&](Registry& r) {
-        return openKey(r, hKey, lpSubKey, samDesired, phkResult);
-    });
-    w32::record("RegOpenKeyExW",
-                {w32::arg(hKey), w32::arg(lpSubKey), ulOptions, samDesired, w32::arg(phkResult)},
-                code);
-    return code;
+    return serve("RegOpenKeyExW", {arg(hKey), arg(lpSubKey), ulOptions, samDesired, arg(phkResult)},
+                 phkResult,
+                 [&](Registry& r) { return openKey(r, hKey, lpSubKey, samDesired, phkResult); });
 }
 
 LSTATUS WINAPI RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD Reserved, LPWSTR lpClass,
                                DWORD dwOptions, REGSAM samDesired,
                                LPSECURITY_ATTRIBUTES lpSecurityAttributes, PHKEY phkResult,
                                LPDWORD lpdwDisposition) {
-    LONG code = serve("RegCreateKeyExW", phkResult, [&](Registry& r) {
-        return createKey(r, hKey, lpSubKey, Reserved, samDesired, phkResult, lpdwDisposition);
-    });
-    w32::record("RegCreateKeyExW",
-                {w32::arg(hKey), w32::arg(lpSubKey), Reserved, w32::arg(lpClass), dwOptions,
-                 samDesired, w32::arg(lpSecurityAttributes), w32::arg(phkResult),
-                 w32::arg(lpdwDisposition)},
-                code);
-    return code;
+    return serve("RegCreateKeyExW",
+                 {arg(hKey), arg(lpSubKey), Reserved, arg(lpClass), dwOptions, samDesired,
+                  arg(lpSecurityAttributes), arg(phkResult), arg(lpdwDisposition)},
+                 phkResult, [&](Registry& r) {
+                     return createKey(r, hKey, lpSubKey, samDesired, phkResult, lpdwDisposition);
+                 });
 }
 
 LSTATUS WINAPI RegQueryValueExW(HKEY hKey, LPCWSTR lpValueName, LPDWORD lpReserved,
                                 LPDWORD lpType, LPBYTE lpData, LPDWORD lpcbData) {
-    LONG code = serve("RegQueryValueExW", nullptr, [&](Registry& r) {
-        return queryValue(r, hKey, lpValueName, lpReserved, lpType, lpData, lpcbData);
-    });
-    w32::record("RegQueryValueExW",
-                {w32::arg(hKey), w32::arg(lpValueName), w32::arg(lpReserved), w32::arg(lpType),
-                 w32::arg(lpData), w32::arg(lpcbData)},
-                code);
-    return code;
+    return serve("RegQueryValueExW",
+                 {arg(hKey), arg(lpValueName), arg(lpReserved), arg(lpType), arg(lpData),
+                  arg(lpcbData)},
+                 nullptr, [&](Registry& r) {
+                     return queryValue(r, hKey, lpValueName, lpType, lpData, lpcbData);
+                 });
 }
 
+// Reserved is ignored: Windows stores the value with Reserved 1 too.
 LSTATUS WINAPI RegSetValueExW(HKEY hKey, LPCWSTR lpValueName, DWORD Reserved, DWORD dwType,
                               const BYTE* lpData, DWORD cbData) {
-    // Reserved is ignored: Windows stores the value with Reserved 1 too.
-    LONG code = serve("RegSetValueExW", nullptr, [&](Registry& r) {
-        return setValue(r, hKey, lpValueName, dwType, lpData, cbData);
-    });
-    w32::record("RegSetValueExW",
-                {w32::arg(hKey), w32::arg(lpValueName), Reserved, dwType, w32::arg(lpData),
-                 cbData},
-                code);
-    return code;
+    return serve("RegSetValueExW",
+                 {arg(hKey), arg(lpValueName), Reserved, dwType, arg(lpData), cbData}, nullptr,
+                 [&](Registry& r) {
+                     return setValue(r, hKey, lpValueName, dwType, lpData, cbData);
+                 });
 }
 
+// No view flag: the process's default view, the 32-bit one.
 LSTATUS WINAPI RegDeleteKeyW(HKEY hKey, LPCWSTR lpSubKey) {
-    // No view flag: the process's default view, the 32-bit one.
-    LONG code = serve("RegDeleteKeyW", nullptr,
-                      [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, 0); });
-    w32::record("RegDeleteKeyW", {w32::arg(hKey), w32::arg(lpSubKey)}, code);
-    return code;
+    return serve("RegDeleteKeyW", {arg(hKey), arg(lpSubKey)}, nullptr,
+                 [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, 0); });
 }
 
+// Reserved is ignored, as Windows does; only the view bits of samDesired count.
 LSTATUS WINAPI RegDeleteKeyExW(HKEY hKey, LPCWSTR lpSubKey, REGSAM samDesired, DWORD Reserved) {
-    // Reserved is ignored, as Windows does; only the view bits of samDesired count.
-    LONG code = serve("RegDeleteKeyExW", nullptr,
-                      [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, samDesired); });
-    w32::record("RegDeleteKeyExW", {w32::arg(hKey), w32::arg(lpSubKey), samDesired, Reserved},
-                code);
-    return code;
+    return serve("RegDeleteKeyExW", {arg(hKey), arg(lpSubKey), samDesired, Reserved}, nullptr,
+                 [&](Registry& r) { return deleteKey(r, hKey, lpSubKey, samDesired); });
 }
 
 LSTATUS WINAPI RegDeleteValueW(HKEY hKey, LPCWSTR lpValueName) {
-    LONG code = serve("RegDeleteValueW", nullptr,
-                      [&](Registry& r) { return deleteValue(r, hKey, lpValueName); });
-    w32::record("RegDeleteValueW", {w32::arg(hKey), w32::arg(lpValueName)}, code);
-    return code;
+    return serve("RegDeleteValueW", {arg(hKey), arg(lpValueName)}, nullptr,
+                 [&](Registry& r) { return deleteValue(r, hKey, lpValueName); });
 }
 
 LSTATUS WINAPI RegEnumKeyExW(HKEY hKey, DWORD dwIndex, LPWSTR lpName, LPDWORD lpcchName,
                              LPDWORD lpReserved, LPWSTR lpClass, LPDWORD lpcchClass,
                              PFILETIME lpftLastWriteTime) {
-    LONG code = serve("RegEnumKeyExW", nullptr, [&](Registry& r) {
-        return enumKey(r, hKey, dwIndex, lpName, lpcchName, lpReserved, lpClass, lpcchClass,
-                       lpftLastWriteTime);
-    });
-    w32::record("RegEnumKeyExW",
-                {w32::arg(hKey), dwIndex, w32::arg(lpName), w32::arg(lpcchName),
-                 w32::arg(lpReserved), w32::arg(lpClass), w32::arg(lpcchClass),
-                 w32::arg(lpftLastWriteTime)},
-                code);
-    return code;
+    return serve("RegEnumKeyExW",
+                 {arg(hKey), dwIndex, arg(lpName), arg(lpcchName), arg(lpReserved), arg(lpClass),
+                  arg(lpcchClass), arg(lpftLastWriteTime)},
+                 nullptr,
+                 [&](Registry& r) { return enumKey(r, hKey, dwIndex, lpName, lpcchName); });
 }
 
 LSTATUS WINAPI RegCloseKey(HKEY hKey) {
-    LONG code = serve("RegCloseKey", nullptr, [&](Registry& r) { return closeKey(r, hKey); });
-    w32::record("RegCloseKey", {w32::arg(hKey)}, code);
-    return code;
+    return serve("RegCloseKey", {arg(hKey)}, nullptr,
+                 [&](Registry& r) { return closeKey(r, hKey); });
 }

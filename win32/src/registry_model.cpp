@@ -2,7 +2,6 @@
 #include "registry_model.h"
 
 #include <algorithm>
-#include <chrono>
 
 namespace w32::reg {
 
@@ -16,7 +15,7 @@ struct CaseRange {
     bool alternating;
 };
 
-const CaseRange kCaseRanges[] = {
+const CaseRange CaseRanges[] = {
     {0x00E0, 0x00F6, -32, false}, {0x00F8, 0x00FE, -32, false}, {0x00FF, 0x00FF, 121, false},
     {0x0101, 0x012F, -1, true},   {0x0133, 0x0137, -1, true},   {0x013A, 0x0148, -1, true},
     {0x014B, 0x0177, -1, true},   {0x017A, 0x017E, -1, true},   {0x03AC, 0x03AC, -38, false},
@@ -33,7 +32,7 @@ const CaseRange kCaseRanges[] = {
 // the simple mappings of these alphabets stand in for it.
 char16_t upcase(char16_t c) {
     if (c < 0x80) return (c >= u'a' && c <= u'z') ? static_cast<char16_t>(c - 32) : c;
-    for (const CaseRange& r : kCaseRanges) {
+    for (const CaseRange& r : CaseRanges) {
         if (c < r.first || c > r.last) continue;
         if (r.alternating && (c - r.first) % 2 != 0) return c;
         return static_cast<char16_t>(c + r.delta);
@@ -43,7 +42,7 @@ char16_t upcase(char16_t c) {
 
 // Keys below HKLM\SOFTWARE that a 32-bit process shares with 64-bit ones (Windows 7 and later);
 // their subkeys are shared too. Every other key below SOFTWARE has a 32-bit copy in Wow6432Node.
-const char16_t* const kSharedBelowSoftware[] = {
+const char16_t* const SharedBelowSoftware[] = {
     u"Classes",
     u"Clients",
     u"Policies",
@@ -95,8 +94,8 @@ const char16_t* const kSharedBelowSoftware[] = {
     u"Microsoft\\Windows NT\\CurrentVersion\\Time Zones",
 };
 
-constexpr std::u16string_view kSoftware = u"SOFTWARE";
-constexpr std::u16string_view kWow6432Node = u"Wow6432Node";
+constexpr std::u16string_view SoftwareName = u"SOFTWARE";
+constexpr std::u16string_view Wow6432NodeName = u"Wow6432Node";
 
 Names splitTrusted(std::u16string_view path) {
     Names out;
@@ -110,7 +109,7 @@ Names splitTrusted(std::u16string_view path) {
 }
 
 // Keys below the shared Classes key that have a 32-bit copy all the same (Windows 7 and later).
-const char16_t* const kRedirectedInShared[] = {
+const char16_t* const RedirectedInShared[] = {
     u"Classes\\CLSID",      u"Classes\\DirectShow",      u"Classes\\Interface",
     u"Classes\\Media Type", u"Classes\\MediaFoundation",
 };
@@ -135,8 +134,8 @@ bool inAny(const std::vector<Names>& table, const Names& path) {
 
 // Whether a path below HKLM\SOFTWARE lies in one of the shared keys.
 bool isShared(const Names& belowSoftware) {
-    static const std::vector<Names>* shared = splitAll(kSharedBelowSoftware);
-    static const std::vector<Names>* redirected = splitAll(kRedirectedInShared);
+    static const std::vector<Names>* shared = splitAll(SharedBelowSoftware);
+    static const std::vector<Names>* redirected = splitAll(RedirectedInShared);
     return inAny(*shared, belowSoftware) && !inAny(*redirected, belowSoftware);
 }
 
@@ -154,20 +153,14 @@ Names pathOf(const Key& key) {
 Names mapSoftware(const Names& full, bool view32) {
     Names tail(full.begin() + 1, full.end());
     bool image32 = view32;
-    if (!tail.empty() && sameName(tail.front(), kWow6432Node)) {
+    if (!tail.empty() && sameName(tail.front(), Wow6432NodeName)) {
         image32 = true;
         tail.erase(tail.begin());
     }
     Names out{full.front()};
-    if (image32 && !isShared(tail)) out.push_back(kWow6432Node);
+    if (image32 && !isShared(tail)) out.push_back(Wow6432NodeName);
     out.insert(out.end(), tail.begin(), tail.end());
     return out;
-}
-
-uint64_t fileTimeNow() {
-    using namespace std::chrono;
-    auto since1970 = duration_cast<nanoseconds>(system_clock::now().time_since_epoch()).count();
-    return static_cast<uint64_t>(since1970 / 100) + 116444736000000000ULL;
 }
 
 KeyRef makeKey(std::u16string_view name, Key* parent, unsigned root) {
@@ -176,7 +169,6 @@ KeyRef makeKey(std::u16string_view name, Key* parent, unsigned root) {
     key->parent = parent;
     key->root = root;
     key->depth = parent ? parent->depth + 1 : 0;
-    key->lastWrite = fileTimeNow();
     return key;
 }
 
@@ -236,9 +228,9 @@ Registry& registry() {
 // DirectShow, Media Type and MediaFoundation subkeys for 32-bit processes; neither is modelled.
 void rebuild(Registry& r) {
     r.handles.clear();
-    for (unsigned i = 0; i < kRootCount; ++i) r.roots[i] = makeKey(u"", nullptr, i);
-    ensurePath(*r.roots[kMachineRoot], u"SOFTWARE\\Wow6432Node");
-    ensurePath(*r.roots[kMachineRoot], u"SOFTWARE\\Classes");
+    for (unsigned i = 0; i < RootCount; ++i) r.roots[i] = makeKey(u"", nullptr, i);
+    ensurePath(*r.roots[MachineRoot], u"SOFTWARE\\Wow6432Node");
+    ensurePath(*r.roots[MachineRoot], u"SOFTWARE\\Classes");
     ensurePath(*r.roots[1], u"Software");
 }
 
@@ -294,17 +286,6 @@ HKEY addHandle(Registry& r, Key& key, DWORD granted) {
     return reinterpret_cast<HKEY>(value);
 }
 
-DWORD requestedRights(REGSAM sam, DWORD denied) {
-    DWORD rights = sam & KEY_ALL_ACCESS;
-    if (sam & GENERIC_READ) rights |= KEY_READ;
-    if (sam & GENERIC_WRITE) rights |= KEY_WRITE;
-    if (sam & GENERIC_EXECUTE) rights |= KEY_EXECUTE;
-    if (sam & GENERIC_ALL) rights |= KEY_ALL_ACCESS;
-    // MAXIMUM_ALLOWED grants whatever the key does not refuse; it never fails by itself.
-    if (sam & MAXIMUM_ALLOWED) rights |= KEY_ALL_ACCESS & ~denied;
-    return rights;
-}
-
 // ---- paths and views ----
 
 LONG checkLeading(const WCHAR* path, const Bound& start) {
@@ -316,18 +297,18 @@ LONG checkLeading(const WCHAR* path, const Bound& start) {
 LONG splitPath(const WCHAR* path, Names& out) {
     out = path ? splitTrusted(path) : Names{};
     for (std::u16string_view name : out)
-        if (name.size() > kMaxKeyNameLength) return ERROR_INVALID_PARAMETER;
+        if (name.size() > MaxKeyNameLength) return ERROR_INVALID_PARAMETER;
     return ERROR_SUCCESS;
 }
 
 Route route(Registry& r, Key& start, const Names& names, REGSAM sam) {
-    if (start.root != kMachineRoot || names.empty()) return Route{&start, names};
+    if (start.root != MachineRoot || names.empty()) return Route{&start, names};
     Names full = pathOf(start);
     full.insert(full.end(), names.begin(), names.end());
-    if (!sameName(full.front(), kSoftware)) return Route{&start, names};
+    if (!sameName(full.front(), SoftwareName)) return Route{&start, names};
     // A 32-bit process sees the 32-bit view unless the call asks for the 64-bit one.
     bool view32 = (sam & KEY_WOW64_64KEY) == 0;
-    return Route{r.roots[kMachineRoot].get(), mapSoftware(full, view32)};
+    return Route{r.roots[MachineRoot].get(), mapSoftware(full, view32)};
 }
 
 // ---- tree ----
@@ -351,8 +332,8 @@ LONG createPath(Key& from, const Names& names, Key*& out, bool& created) {
     if (created) {
         // Windows documents both limits without the code it gives beyond them, and Wine
         // enforces neither; 87, as for the documented limits of names.
-        if (from.depth + names.size() > kMaxDepth) return ERROR_INVALID_PARAMETER;
-        if (names.size() - i > kMaxNewLevels) return ERROR_INVALID_PARAMETER;
+        if (from.depth + names.size() > MaxDepth) return ERROR_INVALID_PARAMETER;
+        if (names.size() - i > MaxNewLevels) return ERROR_INVALID_PARAMETER;
         if (k->denied & KEY_CREATE_SUB_KEY) return ERROR_ACCESS_DENIED;
         for (; i < names.size(); ++i) k = &addChild(*k, names[i]);
     }
@@ -383,8 +364,7 @@ const Key* childAt(Key& parent, size_t index) {
 }
 
 void touch(Key& key) {
-    key.lastWrite = fileTimeNow();
-    key.cursorValid = false;  // the children may have changed
+    key.cursorValid = false;  // the enumeration cursor may point at a child that is gone
 }
 
 }  // namespace w32::reg

@@ -14,13 +14,14 @@
 
 namespace w32::reg {
 
-constexpr size_t kMaxKeyNameLength = 255;      // documented limit of one key name component
-constexpr size_t kMaxValueNameLength = 16383;  // documented limit of a value name
-constexpr unsigned kMaxDepth = 512;            // levels below a root
-constexpr unsigned kMaxNewLevels = 32;         // keys one RegCreateKeyExW call may create
-constexpr DWORD kViewBits = KEY_WOW64_64KEY | KEY_WOW64_32KEY;
-constexpr unsigned kRootCount = 5;
-constexpr unsigned kMachineRoot = 2;  // index of HKEY_LOCAL_MACHINE among the roots
+#pragma GCC visibility push(default)  // the test control reaches the model
+
+constexpr size_t MaxKeyNameLength = 255;      // documented limit of one key name component
+constexpr size_t MaxValueNameLength = 16383;  // documented limit of a value name
+constexpr unsigned MaxDepth = 512;            // levels below a root
+constexpr unsigned MaxNewLevels = 32;         // keys one RegCreateKeyExW call may create
+constexpr unsigned RootCount = 5;
+constexpr unsigned MachineRoot = 2;  // index of HKEY_LOCAL_MACHINE among the roots
 
 using Names = std::vector<std::u16string_view>;
 
@@ -47,8 +48,8 @@ struct FoldedOrder {
     }
 };
 
+// Values are found by their folded name; no caller lists them, so their spelling is not kept.
 struct Value {
-    std::u16string name;  // first writer's spelling
     DWORD type = REG_NONE;
     std::vector<BYTE> data;
 };
@@ -64,7 +65,6 @@ struct Key : std::enable_shared_from_this<Key> {
     unsigned depth = 0;  // levels below the root
     bool deleted = false;
     DWORD denied = 0;  // rights refused to everyone
-    uint64_t lastWrite = 0;  // FILETIME ticks
     Children children;
     std::map<std::u16string, Value, FoldedOrder> values;  // by folded name
     // Where the last enumeration stopped, so that walking the children by index stays linear.
@@ -81,7 +81,7 @@ struct OpenHandle {
 
 struct Registry {
     std::mutex lock;
-    KeyRef roots[kRootCount];
+    KeyRef roots[RootCount];
     std::unordered_map<uintptr_t, OpenHandle> handles;
     uintptr_t nextHandle = 0x100;
 };
@@ -106,8 +106,6 @@ LONG bind(Registry& r, HKEY handle, Bound& out);
 // bind, then the checks of every operation on the key's own contents: rights, then deletion.
 LONG bindFor(Registry& r, HKEY handle, DWORD needed, Bound& out);
 HKEY addHandle(Registry& r, Key& key, DWORD granted);
-// The specific rights a requested mask asks for: generic rights mapped, view bits dropped.
-DWORD requestedRights(REGSAM sam, DWORD denied);
 
 // ---- paths and views ----
 
@@ -117,7 +115,7 @@ LONG checkLeading(const WCHAR* path, const Bound& start);
 LONG splitPath(const WCHAR* path, Names& out);
 // The walk a path takes from `start` in the view of the call's mask.
 struct Route {
-    Key* from;
+    Key* from = nullptr;
     Names names;
 };
 Route route(Registry& r, Key& start, const Names& names, REGSAM sam);
@@ -133,6 +131,9 @@ LONG createPath(Key& from, const Names& names, Key*& out, bool& created);
 LONG removeKey(Key& key);
 // The child at `index` in case-insensitive order, or null past the end.
 const Key* childAt(Key& parent, size_t index);
+// Notes that a key's children or values changed.
 void touch(Key& key);
+
+#pragma GCC visibility pop
 
 }  // namespace w32::reg

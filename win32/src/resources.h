@@ -7,37 +7,31 @@
 // treats an image with any malformed record as one without resources.
 #pragma once
 
-#include <w32/testctl.h>
+#include "byte_cursor.h"
 
 namespace w32 {
 
 // Standard resource types the layer looks up by number.
-constexpr WORD resourceTypeMenu = 4;
-constexpr WORD resourceTypeDialog = 5;
-constexpr WORD resourceTypeString = 6;
+constexpr WORD ResourceTypeMenu = 4;
+constexpr WORD ResourceTypeDialog = 5;
+constexpr WORD ResourceTypeString = 6;
 // U.S. English, the language of every resource the module ships.
-constexpr WORD languageUsEnglish = 0x0409;
+constexpr WORD LanguageUsEnglish = 0x0409;
 
 // The .res image embedded in `instance`, as the resource compiler wrote it; false if it has none.
 bool resourceImage(HINSTANCE instance, const BYTE** data, size_t* size);
 
-// A TYPE or NAME field of a record header: a number, or a text that no numeric lookup matches.
-struct ResourceId {
-    bool isNumber = false;
-    WORD number = 0;
-};
-
 // One resource of an image; `data` points into the image.
 struct ResourceRecord {
-    ResourceId type;
-    ResourceId name;
+    TemplateId type;  // a text matches no numeric lookup
+    TemplateId name;
     WORD language = 0;
     const BYTE* data = nullptr;
     size_t size = 0;
 };
 
 // Walks the records of an image in file order, after the leading empty record.
-class W32_TEST_API ResourceReader {
+class W32_INTERNAL ResourceReader {
 public:
     ResourceReader(const BYTE* image, size_t size);
     // Reads the next record; false at the end of the image or at the first malformed record.
@@ -57,25 +51,25 @@ private:
 
 // Outcome of a lookup: 0 when found, otherwise the error code FindResourceW reports.
 enum class ResourceStatus : DWORD {
-    found = 0,
-    noResources = 1812,   // ERROR_RESOURCE_DATA_NOT_FOUND: no image, or a malformed one
-    typeNotFound = 1813,  // ERROR_RESOURCE_TYPE_NOT_FOUND
-    nameNotFound = 1814,  // ERROR_RESOURCE_NAME_NOT_FOUND
+    Found = 0,
+    NoResources = 1812,   // ERROR_RESOURCE_DATA_NOT_FOUND: no image, or a malformed one
+    TypeNotFound = 1813,  // ERROR_RESOURCE_TYPE_NOT_FOUND
+    NameNotFound = 1814,  // ERROR_RESOURCE_NAME_NOT_FOUND
 };
 
 // Finds resource type/name in an image, in `language` if it has one, else in any language.
-W32_TEST_API ResourceStatus lookupResource(const BYTE* image, size_t imageSize, WORD type,
+W32_INTERNAL ResourceStatus lookupResource(const BYTE* image, size_t imageSize, WORD type,
                                            WORD name, WORD language, const BYTE** data,
                                            size_t* size);
 
 // String `index` (0-15) of a string-table block: its text, not terminated, and its length.
 // Entries that would run past the block's end count as absent (length 0).
-W32_TEST_API const BYTE* blockString(const BYTE* block, size_t size, unsigned index,
+W32_INTERNAL const BYTE* blockString(const BYTE* block, size_t size, unsigned index,
                                      WORD* length);
 
 // Finds a numbered resource of a loaded library as FindResourceW would; on failure sets the last
 // error to the reason (1812, 1813 or 1814) and returns false.
-W32_TEST_API bool findResource(HINSTANCE instance, WORD type, WORD name, WORD language,
+W32_INTERNAL bool findResource(HINSTANCE instance, WORD type, WORD name, WORD language,
                                const BYTE** data, size_t* size);
 
 }  // namespace w32

@@ -1,5 +1,7 @@
-// Test control of the portable Win32 layer: a journal of the calls the layer served and fault
-// injection. Linux builds only; tests that need it skip themselves on Windows builds.
+// Test control of the portable Win32 layer (library hvwin32_testctl): a journal of the calls the
+// layer served and fault injection. The tests, the host simulator, the benchmarks and the fuzz
+// targets link it; the module cannot. Linux builds only; tests that need it skip themselves on
+// Windows builds.
 #pragma once
 
 #include <windows.h>
@@ -40,6 +42,8 @@ W32_TEST_API std::vector<Call> callsOf(std::string_view function);
 W32_TEST_API void failCall(std::string_view function, unsigned nth, long code);
 // Makes every call of `function` from now on fail with `code`.
 W32_TEST_API void failAlways(std::string_view function, long code);
+// Disarms the fault of one function, or all of them.
+W32_TEST_API void clearFault(std::string_view function);
 W32_TEST_API void clearFaults();
 
 // Blocks handed out by calloc/malloc through the layer and not yet freed.
@@ -50,10 +54,6 @@ W32_TEST_API size_t liveAllocations();
 W32_TEST_API std::vector<HMENU> liveMenus();
 // Every menu object alive, held popups included.
 W32_TEST_API size_t menuObjectCount();
-// Forgets every menu; reset() calls it.
-W32_TEST_API void resetMenus();
-
-}  // namespace w32test
 
 // ---- Registry test control -------------------------------------------------------------
 // Every registry call is journaled with its arguments in Windows' order, pointers as
@@ -66,11 +66,11 @@ W32_TEST_API void resetMenus();
 // lpcchName, lpReserved, lpClass, lpcchClass, lpftLastWriteTime}; RegCloseKey {hKey};
 // GetVersionExW {lpVersionInformation}. failCall/failAlways with a registry function's name
 // make it return that code and change nothing (a failed open or create sets *phkResult NULL).
-namespace w32test {
+// Denied rights and hidden exports plug into the layer when this library is loaded.
 
 // An empty registry: the five roots, HKLM\SOFTWARE with Wow6432Node and Classes, and
 // HKCU\Software; every handle closed, no right denied. Also unhides every export and gives
-// GetVersionExW back its defaults. reset() calls it. HKEY_CLASSES_ROOT is a root of its own,
+// GetVersionExW back its platform. reset() calls it. HKEY_CLASSES_ROOT is a root of its own,
 // not an alias of HKLM\SOFTWARE\Classes; only HKLM\SOFTWARE has a 32-bit view.
 W32_TEST_API void resetRegistry();
 // Handles open now, predefined ones excluded.
@@ -83,12 +83,10 @@ W32_TEST_API size_t openHandleCount();
 W32_TEST_API void denyAccess(HKEY root, std::u16string path, DWORD rights);
 // Makes GetProcAddress on the system libraries (advapi32 ...) find `name` or not.
 W32_TEST_API void hideExport(const char* name, bool hidden);
-// Makes GetVersionExW return 0 (last error 87) while `fail` is set.
+// Makes GetVersionExW return 0 (last error 87) while `fail` is set; reset() clears it too.
 W32_TEST_API void setVersionFault(bool fail);
 // The dwPlatformId GetVersionExW reports; VER_PLATFORM_WIN32_NT (2) by default.
 W32_TEST_API void setPlatformId(DWORD id);
-
-}  // namespace w32test
 
 // ---- File test control -----------------------------------------------------------------
 // ReadFile and WriteFile are journaled as {hFile, lpBuffer, nNumberOfBytes, lpNumberOfBytes,
@@ -96,7 +94,6 @@ W32_TEST_API void setPlatformId(DWORD id);
 // dwCreationDisposition} with the handle; CloseHandle as {hObject}. failCall/failAlways with
 // "ReadFile", "WriteFile" or "CreateFileW" make the call fail with that code (last error) and
 // touch nothing: no byte is read or written and the reported count is 0.
-namespace w32test {
 
 // A file handle over an open descriptor (a pipe, a memfd, a temporary file); the handle owns
 // it from now on, and CloseHandle closes it.
@@ -111,21 +108,16 @@ W32_TEST_API void shortRead(unsigned nth, DWORD missing);
 // File handles open now.
 W32_TEST_API size_t openFileCount();
 
-}  // namespace w32test
-
 // ---- Window test control -----------------------------------------------------------------
 // DialogBoxParamW, EndDialog, GetDlgItem, SendMessageW, PostMessageW, the window-long functions,
 // SetTimer and KillTimer are journaled with their arguments in Windows' order; failCall/
 // failAlways("DialogBoxParamW", ...) make it return -1 with that last error and create nothing.
 // A modal loop left with no message and no timer while its dialog is open journals
 // "ModalLoopStalled" {dialog} and makes DialogBoxParamW return -1 (last error ERROR_TIMEOUT).
-namespace w32test {
 
 // Every window alive now (dialogs and their controls).
 W32_TEST_API std::vector<HWND> liveWindows();
-// Timers set and not yet killed (a dialog's window timers go with it).
+// Timers set and not yet killed.
 W32_TEST_API size_t pendingTimers();
-// Drops every window, posted message and timer; reset() calls it.
-W32_TEST_API void resetWindows();
 
 }  // namespace w32test

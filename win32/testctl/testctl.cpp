@@ -1,9 +1,19 @@
-// Journal and fault injection of the portable Win32 layer.
+// Journal and fault injection of the portable Win32 layer, plugged into its hooks when this
+// library is loaded; and the allocation count, taken from the journal's calls.
+#include <w32/testctl.h>
+
 #include "internal.h"
 
 #include <atomic>
 #include <map>
 #include <mutex>
+
+namespace w32test {
+// From registry_control.cpp and objects_control.cpp.
+bool exportHidden(const char* name);
+DWORD platformId();
+void resetObjects();
+}  // namespace w32test
 
 namespace {
 
@@ -24,14 +34,18 @@ State& state() {
     return *s;
 }
 
-// Read on every served call, so it is kept apart from the journal's lock.
+// Read on every served call, so they are kept apart from the journal's lock.
 std::atomic<bool> journalOn{true};
+std::atomic<size_t> liveBlocks{0};
 
-}  // namespace
-
-namespace w32 {
+// Counts the blocks calloc and malloc hand out and free takes back, journaled or not.
+void countBlocks(std::string_view function, std::initializer_list<uint64_t> args, int64_t result) {
+    if ((function == "calloc" || function == "malloc") && result) ++liveBlocks;
+    if (function == "free" && *args.begin()) --liveBlocks;
+}
 
 void record(std::string_view function, std::initializer_list<uint64_t> args, int64_t result) {
+    countBlocks(function, args, result);
     if (!journalOn.load(std::memory_order_relaxed)) return;
     State& s = state();
     std::lock_guard<std::mutex> guard(s.lock);
@@ -54,24 +68,25 @@ std::optional<long> takeFault(std::string_view function) {
     return code;
 }
 
-}  // namespace w32
+[[maybe_unused]] const bool Plugged = [] {
+    w32::control.record = record;
+    w32::control.takeFault = takeFault;
+    w32::control.exportHidden = w32test::exportHidden;
+    w32::control.platformId = w32test::platformId;
+    return true;
+}();
+
+}  // namespace
 
 namespace w32test {
-
-void resetAllocations();
-void resetRegistry() __attribute__((weak));
-void resetFiles();
-void resetWindows() __attribute__((weak));
 
 void reset() {
     setJournal(true);
     clearJournal();
     clearFaults();
     SetLastError(0);
-    resetMenus();
-    if (resetRegistry) resetRegistry();
-    resetFiles();
-    if (resetWindows) resetWindows();
+    resetRegistry();
+    resetObjects();
 }
 
 const std::vector<Call>& journal() { return state().journal; }
@@ -108,10 +123,18 @@ void failAlways(std::string_view function, long code) {
     s.faults[std::string(function)] = Fault{0, code, true};
 }
 
+void clearFault(std::string_view function) {
+    State& s = state();
+    std::lock_guard<std::mutex> guard(s.lock);
+    s.faults.erase(std::string(function));
+}
+
 void clearFaults() {
     State& s = state();
     std::lock_guard<std::mutex> guard(s.lock);
     s.faults.clear();
 }
+
+size_t liveAllocations() { return liveBlocks.load(); }
 
 }  // namespace w32test
