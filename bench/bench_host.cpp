@@ -46,11 +46,11 @@ ExpressionRoutine expressionRoutine(const hv::Module& module, const char* routin
 Instance::Instance(hv::Module& module)
     : destroy_(module.entry<DestroyEntry>("DestroyRunObject")),
       record_(std::max<size_t>(
-                  static_cast<uint16_t>(
-                      module.entry<DataSizeEntry>("GetRunObjectDataSize")(0, 0)),
+                  static_cast<uint16_t>(module.entry<DataSizeEntry>("GetRunObjectDataSize")(0, 0)),
                   L.recordSize),
               0),
-      runHeader_(L.runHeaderSize, 0), buffer_(4096, 0) {
+      runHeader_(L.runHeaderSize, 0),
+      buffer_(4096, 0) {
     store(runHeader_, L.getStringBuffer, &Instance::stringBuffer);
     store(runHeader_, L.getFirstExpressionParameter, &Instance::firstExpressionParameter);
     store(runHeader_, L.getNextExpressionParameter, &Instance::nextExpressionParameter);

@@ -26,8 +26,7 @@ double median(std::vector<double> values) {
 
 }  // namespace
 
-RatioReporter::RatioReporter()
-    : ConsoleReporter(isatty(STDOUT_FILENO) ? OO_Color : OO_None) {}
+RatioReporter::RatioReporter() : ConsoleReporter(isatty(STDOUT_FILENO) ? OO_Color : OO_None) {}
 
 void RatioReporter::comparePair(const std::string& routine, const std::string& moduleName,
                                 const std::string& rawName, const std::string& sideName) {
@@ -108,8 +107,8 @@ bool RatioReporter::printSummary(std::ostream& out, double pairTarget) const {
         for (const Pair& p : pairs_) {
             if (!ran(p.module) && !ran(p.side)) continue;
             double moduleNs = 0, rawNs = 0, sideModule = 0, sideRaw = 0, ratio = 0;
-            bool separate = typical(p.module, &moduleNs, "fast_ns") &&
-                            typical(p.raw, &rawNs, "fast_ns");
+            bool separate =
+                typical(p.module, &moduleNs, "fast_ns") && typical(p.raw, &rawNs, "fast_ns");
             bool side = typical(p.side, &sideModule, "module_ns") &&
                         typical(p.side, &sideRaw, "raw_ns") && typical(p.side, &ratio, "ratio");
             char first[40] = "       -        -        -";
@@ -122,7 +121,10 @@ bool RatioReporter::printSummary(std::ostream& out, double pairTarget) const {
                               ratio);
             if (!side) complete = false;
             std::snprintf(line, sizeof(line), "%-20s %s | %s  %s\n", p.routine.c_str(), first,
-                          second, !side ? "not measured" : ratio <= pairTarget ? "met" : "NOT MET");
+                          second,
+                          !side                 ? "not measured"
+                          : ratio <= pairTarget ? "met"
+                                                : "NOT MET");
             out << line;
         }
     }
@@ -133,8 +135,7 @@ bool RatioReporter::printSummary(std::ostream& out, double pairTarget) const {
         out << "\nThe routine's own work, ns per call: parameters fetched and checked, stopped "
                "by a null\nparameter before the registry (fast blocks), beside the module's "
                "extra time over the raw\ncalls (side by side)\n";
-        std::snprintf(line, sizeof(line), "%-20s %10s %16s\n", "routine", "own",
-                      "module - raw");
+        std::snprintf(line, sizeof(line), "%-20s %10s %16s\n", "routine", "own", "module - raw");
         out << line;
         for (const Own& o : own_) {
             if (!ran(o.name)) continue;
@@ -146,9 +147,9 @@ bool RatioReporter::printSummary(std::ostream& out, double pairTarget) const {
             }
             bool paired = false;
             for (const Pair& p : pairs_)
-                paired = paired || (p.routine == o.routine &&
-                                    typical(p.side, &moduleNs, "module_ns") &&
-                                    typical(p.side, &rawNs, "raw_ns"));
+                paired =
+                    paired || (p.routine == o.routine && typical(p.side, &moduleNs, "module_ns") &&
+                               typical(p.side, &rawNs, "raw_ns"));
             if (paired)
                 std::snprintf(line, sizeof(line), "%-20s %10.1f %16.1f\n", o.routine.c_str(), own,
                               moduleNs - rawNs);

@@ -48,7 +48,7 @@ private:
         double median = -1;
     };
     struct Results {
-        Series time;                            // real time per iteration, ns
+        Series time;                             // real time per iteration, ns
         std::map<std::string, Series> counters;  // user counters
         bool failed = false;
     };

@@ -77,8 +77,7 @@ LONG rawReadString(HKEY root, const WCHAR* path, const WCHAR* name, WCHAR* buffe
     DWORD type = 0, size = 0;
     code = RegQueryValueExW(key, name, nullptr, &type, nullptr, &size);
     if (code == ERROR_SUCCESS)
-        code = RegQueryValueExW(key, name, nullptr, &type, reinterpret_cast<BYTE*>(buffer),
-                                &size);
+        code = RegQueryValueExW(key, name, nullptr, &type, reinterpret_cast<BYTE*>(buffer), &size);
     RegCloseKey(key);
     return code;
 }
@@ -145,8 +144,8 @@ bool prepareValues() {
     ok = ok && RegSetValueExW(key, StringName, 0, REG_SZ, reinterpret_cast<const BYTE*>(Title),
                               static_cast<DWORD>((length(Title) + 1) * sizeof(WCHAR))) == 0;
     // A few neighbours, so that the values looked up are not alone in their key.
-    const WCHAR* others[] = {TEXT("Width"), TEXT("Height"), TEXT("Left"), TEXT("Top"),
-                             TEXT("Theme"), TEXT("Language")};
+    const WCHAR* others[] = {TEXT("Width"), TEXT("Height"), TEXT("Left"),
+                             TEXT("Top"),   TEXT("Theme"),  TEXT("Language")};
     for (const WCHAR* other : others)
         ok = ok && RegSetValueExW(key, other, 0, REG_DWORD, reinterpret_cast<BYTE*>(&count),
                                   sizeof(count)) == ERROR_SUCCESS;
@@ -174,9 +173,8 @@ bool buildWide(const WCHAR* path, const std::vector<std::u16string>& names) {
     bool ok = true;
     for (const std::u16string& name : names) {
         HKEY child;
-        ok = ok && RegCreateKeyExW(parent, reinterpret_cast<const WCHAR*>(name.c_str()), 0,
-                                   nullptr, 0, WriteAccess, nullptr, &child,
-                                   nullptr) == ERROR_SUCCESS;
+        ok = ok && RegCreateKeyExW(parent, reinterpret_cast<const WCHAR*>(name.c_str()), 0, nullptr,
+                                   0, WriteAccess, nullptr, &child, nullptr) == ERROR_SUCCESS;
         if (ok) RegCloseKey(child);
     }
     RegCloseKey(parent);
@@ -203,8 +201,7 @@ bool buildDeep(const WCHAR* path, unsigned levels) {
 
 bool keyExists(const WCHAR* path) {
     HKEY key;
-    if (RegOpenKeyExW(HKEY_CURRENT_USER, path, 0, ReadAccess, &key) != ERROR_SUCCESS)
-        return false;
+    if (RegOpenKeyExW(HKEY_CURRENT_USER, path, 0, ReadAccess, &key) != ERROR_SUCCESS) return false;
     RegCloseKey(key);
     return true;
 }
@@ -260,12 +257,11 @@ inline void keep(const Slot& value) { benchmark::DoNotOptimize(value); }
 template <typename Call>
 std::string failure(const Call& call, Slot result) {
     return "the routine did not do what it should (lastError " +
-           std::to_string(call.instance->lastError()) + ", result " + std::to_string(result) +
-           ")";
+           std::to_string(call.instance->lastError()) + ", result " + std::to_string(result) + ")";
 }
 
-using Prepare = std::function<void()>;        // parameters for the host's services
-using Check = std::function<bool(Slot)>;      // the last call's result and lastError
+using Prepare = std::function<void()>;    // parameters for the host's services
+using Check = std::function<bool(Slot)>;  // the last call's result and lastError
 
 // The routine alone, timed in blocks of `block` calls (BlockClock).
 template <typename Call>
@@ -412,31 +408,33 @@ void registerDeletion(Fixture& f, bench::RatioReporter& reporter, const std::str
     bench::Instance* instance = &f.instance;
     bench::ActionRoutine deleteKey = bench::actionRoutine(f.module, "ActDeleteKey");
     Slot root = f.currentUser.slot();
-    benchmark::RegisterBenchmark(name.c_str(), [=](benchmark::State& state) {
-        double total = 0, fastest = 0;
-        for (auto _ : state) {
-            if (!build()) {
-                state.SkipWithError("cannot build the key tree");
-                break;
+    benchmark::RegisterBenchmark(
+        name.c_str(),
+        [=](benchmark::State& state) {
+            double total = 0, fastest = 0;
+            for (auto _ : state) {
+                if (!build()) {
+                    state.SkipWithError("cannot build the key tree");
+                    break;
+                }
+                double start = threadSeconds();
+                deleteKey(instance->record(), root, textSlot(path));
+                double seconds = threadSeconds() - start;
+                state.SetIterationTime(seconds);
+                total += seconds;
+                if (fastest == 0 || seconds < fastest) fastest = seconds;
+                if (instance->lastError() != 0 || keyExists(path)) {
+                    state.SkipWithError("the tree was not deleted");
+                    break;
+                }
             }
-            double start = threadSeconds();
-            deleteKey(instance->record(), root, textSlot(path));
-            double seconds = threadSeconds() - start;
-            state.SetIterationTime(seconds);
-            total += seconds;
-            if (fastest == 0 || seconds < fastest) fastest = seconds;
-            if (instance->lastError() != 0 || keyExists(path)) {
-                state.SkipWithError("the tree was not deleted");
-                break;
+            state.counters["keys"] = keys;
+            if (state.iterations() > 0) {
+                state.counters["ns_per_key"] =
+                    total * 1e9 / (static_cast<double>(state.iterations()) * keys);
+                state.counters["fast_ns"] = fastest * 1e9;  // the fastest deletion of the tree
             }
-        }
-        state.counters["keys"] = keys;
-        if (state.iterations() > 0) {
-            state.counters["ns_per_key"] =
-                total * 1e9 / (static_cast<double>(state.iterations()) * keys);
-            state.counters["fast_ns"] = fastest * 1e9;  // the fastest deletion of the tree
-        }
-    })
+        })
         ->UseManualTime()
         ->Iterations(iterations)
         ->Repetitions(5)
@@ -447,26 +445,28 @@ void registerDeletion(Fixture& f, bench::RatioReporter& reporter, const std::str
 void registerRawDeletion(bench::RatioReporter& reporter, const std::string& name,
                          const std::string& label, unsigned keys, int iterations,
                          std::function<bool()> build, const WCHAR* path) {
-    benchmark::RegisterBenchmark(name.c_str(), [=](benchmark::State& state) {
-        double fastest = 0;
-        for (auto _ : state) {
-            if (!build()) {
-                state.SkipWithError("cannot build the key tree");
-                break;
-            }
-            double start = threadSeconds();
-            LONG code = rawDeleteTree(HKEY_CURRENT_USER, path);
-            double seconds = threadSeconds() - start;
-            state.SetIterationTime(seconds);
-            if (fastest == 0 || seconds < fastest) fastest = seconds;
-            if (code != ERROR_SUCCESS) {
-                state.SkipWithError("the tree was not deleted");
-                break;
-            }
-        }
-        state.counters["keys"] = keys;
-        if (state.iterations() > 0) state.counters["fast_ns"] = fastest * 1e9;
-    })
+    benchmark::RegisterBenchmark(name.c_str(),
+                                 [=](benchmark::State& state) {
+                                     double fastest = 0;
+                                     for (auto _ : state) {
+                                         if (!build()) {
+                                             state.SkipWithError("cannot build the key tree");
+                                             break;
+                                         }
+                                         double start = threadSeconds();
+                                         LONG code = rawDeleteTree(HKEY_CURRENT_USER, path);
+                                         double seconds = threadSeconds() - start;
+                                         state.SetIterationTime(seconds);
+                                         if (fastest == 0 || seconds < fastest) fastest = seconds;
+                                         if (code != ERROR_SUCCESS) {
+                                             state.SkipWithError("the tree was not deleted");
+                                             break;
+                                         }
+                                     }
+                                     state.counters["keys"] = keys;
+                                     if (state.iterations() > 0)
+                                         state.counters["fast_ns"] = fastest * 1e9;
+                                 })
         ->UseManualTime()
         ->Iterations(iterations)
         ->Repetitions(5)
@@ -499,9 +499,8 @@ std::vector<char*> withDefaults(int argc, char** argv, std::vector<std::string>&
 // Checks that a routine succeeds and makes exactly the registry calls of its raw sequence, then
 // registers its benchmarks.
 template <typename Call, typename RawCall>
-bool addRoutine(bench::RatioReporter& reporter, const std::string& name,
-                const std::string& rawName, Prepare prepare, Call call, RawCall raw,
-                Check check) {
+bool addRoutine(bench::RatioReporter& reporter, const std::string& name, const std::string& rawName,
+                Prepare prepare, Call call, RawCall raw, Check check) {
     prepare();
     Slot result = 0;
     std::vector<std::string> moduleCalls = callsOf([&] { result = call(); });
@@ -606,21 +605,20 @@ int main(int argc, char** argv) {
     const Slot dwordTarget = textSlot(DwordTarget), stringTarget = textSlot(StringTarget);
     const Slot label = textSlot(Label);
     bool ok = true;
-    ok &= addRoutine(reporter, "ExpGetCurrentDword", "OpenQueryDwordClose",
-                     parameters({dwordName}), expression("ExpGetCurrentDword"), readDword,
-                     dwordRead);
+    ok &= addRoutine(reporter, "ExpGetCurrentDword", "OpenQueryDwordClose", parameters({dwordName}),
+                     expression("ExpGetCurrentDword"), readDword, dwordRead);
     ok &= addRoutine(reporter, "ExpGetCurrentString", "OpenProbeQueryStringClose",
                      parameters({stringName}), expression("ExpGetCurrentString"), readString,
                      stringRead);
     ok &= addRoutine(reporter, "ExpGetDword", "OpenQueryDwordClose",
-                     parameters({rootName, path, dwordName}), expression("ExpGetDword"),
-                     readDword, dwordRead);
+                     parameters({rootName, path, dwordName}), expression("ExpGetDword"), readDword,
+                     dwordRead);
     ok &= addRoutine(reporter, "ExpGetString", "OpenProbeQueryStringClose",
                      parameters({rootName, path, stringName}), expression("ExpGetString"),
                      readString, stringRead);
-    ok &= addRoutine(reporter, "ActSetCurrentDword", "CreateSetDwordClose", none,
-                     action("ActSetCurrentDword", dwordTarget, WrittenDword), writeDword,
-                     succeeded);
+    ok &=
+        addRoutine(reporter, "ActSetCurrentDword", "CreateSetDwordClose", none,
+                   action("ActSetCurrentDword", dwordTarget, WrittenDword), writeDword, succeeded);
     ok &= addRoutine(reporter, "ActSetCurrentString", "CreateProbeSetStringClose", none,
                      action("ActSetCurrentString", stringTarget, label), writeString, succeeded);
     ok &= addRoutine(reporter, "ActSetDword", "CreateSetDwordClose",
@@ -651,8 +649,8 @@ int main(int argc, char** argv) {
                      action("ActSetCurrentDword", 0, WrittenDword));
     ok &= addOwnWork(reporter, in, "ActSetCurrentString", none,
                      action("ActSetCurrentString", stringTarget, 0));
-    ok &= addOwnWork(reporter, in, "ActSetDword",
-                     parameters({root, 0, dwordTarget, WrittenDword}), action("ActSetDword"));
+    ok &= addOwnWork(reporter, in, "ActSetDword", parameters({root, 0, dwordTarget, WrittenDword}),
+                     action("ActSetDword"));
     ok &= addOwnWork(reporter, in, "ActSetString", parameters({root, 0, stringTarget, label}),
                      action("ActSetString"));
     ok &= addOwnWork(reporter, in, "ActCreateKey", parameters({root, 0}), action("ActCreateKey"));
@@ -661,14 +659,18 @@ int main(int argc, char** argv) {
 
     auto small = std::make_shared<std::vector<std::u16string>>(subkeyNames(5000));
     auto large = std::make_shared<std::vector<std::u16string>>(subkeyNames(50000));
-    registerDeletion(f, reporter, "Module/DeleteKey/wide:5000", "wide, 5,000 subkeys", 5001, 20,
-                     [small] { return buildWide(Wide, *small); }, Wide);
-    registerDeletion(f, reporter, "Module/DeleteKey/wide:50000", "wide, 50,000 subkeys", 50001, 4,
-                     [large] { return buildWide(Wide, *large); }, Wide);
-    registerDeletion(f, reporter, "Module/DeleteKey/deep:512", "deep, 512 levels", DeepLevels,
-                     100, [] { return buildDeep(Deep, DeepLevels); }, Deep);
-    registerRawDeletion(reporter, "Raw/DeleteWalk/wide:5000", "raw walk, wide, 5,000 subkeys",
-                        5001, 20, [small] { return buildWide(Wide, *small); }, Wide);
+    registerDeletion(
+        f, reporter, "Module/DeleteKey/wide:5000", "wide, 5,000 subkeys", 5001, 20,
+        [small] { return buildWide(Wide, *small); }, Wide);
+    registerDeletion(
+        f, reporter, "Module/DeleteKey/wide:50000", "wide, 50,000 subkeys", 50001, 4,
+        [large] { return buildWide(Wide, *large); }, Wide);
+    registerDeletion(
+        f, reporter, "Module/DeleteKey/deep:512", "deep, 512 levels", DeepLevels, 100,
+        [] { return buildDeep(Deep, DeepLevels); }, Deep);
+    registerRawDeletion(
+        reporter, "Raw/DeleteWalk/wide:5000", "raw walk, wide, 5,000 subkeys", 5001, 20,
+        [small] { return buildWide(Wide, *small); }, Wide);
     reporter.scaling("time per key, 50,000 / 5,000 subkeys", "Module/DeleteKey/wide:50000",
                      "Module/DeleteKey/wide:5000", ScalingTarget);
     reporter.scaling("module / raw walk, 5,000 subkeys", "Module/DeleteKey/wide:5000",

@@ -15,8 +15,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         // Every record's data must lie inside the image.
         if (record.data < data || record.data + record.size > data + size) __builtin_trap();
     }
-    const WORD types[] = {w32::ResourceTypeMenu, w32::ResourceTypeDialog,
-                          w32::ResourceTypeString, 2, 10};
+    const WORD types[] = {w32::ResourceTypeMenu, w32::ResourceTypeDialog, w32::ResourceTypeString,
+                          2, 10};
     for (WORD type : types) {
         for (WORD name : {1, 2, 9, 63, 101, 200, 400, 438, 20000}) {
             const BYTE* found = nullptr;

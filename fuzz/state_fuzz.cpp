@@ -70,8 +70,8 @@ void loadInto(hv::Instance& instance, const uint8_t* data, size_t size) {
         check(before ? key == before && oldKey == key : key == nullptr);
         return;
     }
-    check(instance.rootKeyIndex() == (data[4] | data[5] << 8 | data[6] << 16 |
-                                      static_cast<uint32_t>(data[7]) << 24));
+    check(instance.rootKeyIndex() ==
+          (data[4] | data[5] << 8 | data[6] << 16 | static_cast<uint32_t>(data[7]) << 24));
     if (key) {
         // The block is the stored length: a zero must come within it (ASan guards the rest).
         size_t units = (data[12] | data[13] << 8) / 2, i = 0;

@@ -51,21 +51,21 @@ inline WString widen(const std::string& ascii) { return WString(ascii.begin(), a
 
 // Skips a test, or a row, that needs the layer's test control (call journal, fault injection,
 // handle counts, settings): over Windows there is nothing to drive.
-#define HV_LAYER_ONLY(why)                                               \
-    do {                                                                 \
-        if (!HV_OVER_LAYER) GTEST_SKIP() << "needs the layer: " << why;  \
+#define HV_LAYER_ONLY(why)                                              \
+    do {                                                                \
+        if (!HV_OVER_LAYER) GTEST_SKIP() << "needs the layer: " << why; \
     } while (0)
 
 // Skips a row where Wine is known to answer otherwise than Windows; the assertion stays for the
 // layer and for Windows itself.
-#define HV_WINE_DIFFERS(why)                                                                   \
-    do {                                                                                       \
-        if (conf::underWine() && !conf::runWineDifferences())                                  \
-            GTEST_SKIP() << "Wine differs: " << why;                                           \
+#define HV_WINE_DIFFERS(why)                                  \
+    do {                                                      \
+        if (conf::underWine() && !conf::runWineDifferences()) \
+            GTEST_SKIP() << "Wine differs: " << why;          \
     } while (0)
 
 // Skips a row whose call Wine does not survive (a page fault ends the test program).
-#define HV_WINE_CRASHES(why)                                                    \
-    do {                                                                        \
-        if (conf::underWine()) GTEST_SKIP() << "Wine crashes: " << why;         \
+#define HV_WINE_CRASHES(why)                                            \
+    do {                                                                \
+        if (conf::underWine()) GTEST_SKIP() << "Wine crashes: " << why; \
     } while (0)

@@ -10,9 +10,9 @@ void WINAPI ignoreDebugString(LPCSTR) {}
 }  // namespace
 
 #ifdef _WIN64
-extern "C" void(WINAPI* const outputDebugStringImport)(LPCSTR) asm(
-    "__imp_OutputDebugStringA") = ignoreDebugString;
+extern "C" void(WINAPI* const outputDebugStringImport)(LPCSTR) asm("__imp_OutputDebugStringA") =
+    ignoreDebugString;
 #else
-extern "C" void(WINAPI* const outputDebugStringImport)(LPCSTR) asm(
-    "__imp__OutputDebugStringA@4") = ignoreDebugString;
+extern "C" void(WINAPI* const outputDebugStringImport)(LPCSTR) asm("__imp__OutputDebugStringA@4") =
+    ignoreDebugString;
 #endif

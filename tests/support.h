@@ -23,9 +23,9 @@ namespace hvtest {
 hv::Module& module();
 
 // Skips the current test where the portable layer's fault injection is not available.
-#define HV_NEEDS_TEST_CONTROL()                                                        \
-    do {                                                                               \
-        if (!HV_HAS_TEST_CONTROL)                                                      \
+#define HV_NEEDS_TEST_CONTROL()                                                         \
+    do {                                                                                \
+        if (!HV_HAS_TEST_CONTROL)                                                       \
             GTEST_SKIP() << "needs the portable Win32 layer's fault injection (Linux)"; \
     } while (0)
 

@@ -30,8 +30,8 @@ std::string exportName(EventKind kind, const char* what) {
 class TextBuffer {
 public:
     TextBuffer(const std::string& entryPoint, int capacity)
-        : block_(entryPoint + "'s buffer",
-                 2 * static_cast<size_t>(capacity > 0 ? capacity : 0) + 2, 0) {}
+        : block_(entryPoint + "'s buffer", 2 * static_cast<size_t>(capacity > 0 ? capacity : 0) + 2,
+                 0) {}
     LPWSTR data() { return reinterpret_cast<LPWSTR>(block_.data()); }
     // The text up to its terminator (or the capacity, if the module left none).
     std::u16string text() {
@@ -179,7 +179,8 @@ std::u16string Catalogue::sentence(EventKind kind, int code, const std::vector<P
         char16_t next = i + 1 < format.size() ? format[i + 1] : 0;
         if (format[i] == u'%' && next >= u'0' && next <= u'3') {
             size_t index = static_cast<size_t>(next - u'0');
-            out += index < params.size() ? parameterText(params[index]) : u"%" + std::u16string(1, next);
+            out += index < params.size() ? parameterText(params[index])
+                                         : u"%" + std::u16string(1, next);
             ++i;
         } else if (format[i] == u'%' && next == u'o') {
             out += identity()[0];

@@ -41,8 +41,10 @@ std::vector<std::u16string> listItems(HWND list) {
         auto length = SendMessageW(list, LB_GETTEXTLEN, static_cast<WPARAM>(i), 0);
         if (length < 0) break;
         std::vector<WCHAR> text(static_cast<size_t>(length) + 1);
-        SendMessageW(list, LB_GETTEXT, static_cast<WPARAM>(i), reinterpret_cast<LPARAM>(text.data()));
-        items.emplace_back(reinterpret_cast<const char16_t*>(text.data()), static_cast<size_t>(length));
+        SendMessageW(list, LB_GETTEXT, static_cast<WPARAM>(i),
+                     reinterpret_cast<LPARAM>(text.data()));
+        items.emplace_back(reinterpret_cast<const char16_t*>(text.data()),
+                           static_cast<size_t>(length));
     }
     return items;
 }

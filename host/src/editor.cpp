@@ -61,12 +61,11 @@ void* Editor::structure() {
     return bytes_.data();
 }
 
-void Editor::setWindow(HWND window) {
-    writeAt(bytes_.data(), BuildLayout.editorWindow, window);
-}
+void Editor::setWindow(HWND window) { writeAt(bytes_.data(), BuildLayout.editorWindow, window); }
 
 ParamEditor::ParamEditor(Module& module, Editor& editor)
-    : module_(module), editor_(editor),
+    : module_(module),
+      editor_(editor),
       bytes_(BuildLayout.rootParamSize + Fill::GuardSize, Fill::Guard) {
     setRecord(0);
 }

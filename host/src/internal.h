@@ -9,9 +9,7 @@
 namespace hv {
 
 // A UTF-16 text as the platform's wide string (wchar_t on Windows, char16_t on Linux).
-inline LPCWSTR wide(const std::u16string& text) {
-    return reinterpret_cast<LPCWSTR>(text.c_str());
-}
+inline LPCWSTR wide(const std::u16string& text) { return reinterpret_cast<LPCWSTR>(text.c_str()); }
 
 // A zero-terminated platform wide string as UTF-16 text.
 inline std::u16string fromWide(const WCHAR* text) {

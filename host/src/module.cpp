@@ -80,13 +80,9 @@ std::unique_ptr<Module> Module::load(const std::string& path, std::string* error
     return module;
 }
 
-Module::~Module() {
-    FreeLibrary(handle_);
-}
+Module::~Module() { FreeLibrary(handle_); }
 
-FARPROC Module::address(const char* name) const {
-    return GetProcAddress(handle_, name);
-}
+FARPROC Module::address(const char* name) const { return GetProcAddress(handle_, name); }
 
 FARPROC Module::require(const char* name) const {
     FARPROC found = address(name);
@@ -126,8 +122,6 @@ std::string defaultModulePath() {
     return pathBesideProgram("Hivelet.hzx");
 }
 
-std::string pathBesideProgram(const std::string& fileName) {
-    return programFolder() + fileName;
-}
+std::string pathBesideProgram(const std::string& fileName) { return programFolder() + fileName; }
 
 }  // namespace hv

@@ -170,9 +170,7 @@ void run(Session& session, const Step& step, const Show& line) {
     session.show(step, toUtf8(*session.sentence));
 }
 
-void run(Session& session, const Step&, const Echo& line) {
-    session.out << line.text << '\n';
-}
+void run(Session& session, const Step&, const Echo& line) { session.out << line.text << '\n'; }
 
 void run(Session& session, const Step& step, const New&) {
     session.freshInstance();

@@ -17,9 +17,7 @@ struct Refusal : std::runtime_error {
     using std::runtime_error::runtime_error;
 };
 
-[[noreturn]] inline void refuse(const std::string& why) {
-    throw Refusal(why);
-}
+[[noreturn]] inline void refuse(const std::string& why) { throw Refusal(why); }
 
 // Refuses with `error` unless it is empty.
 inline void refuseIf(const std::string& error) {
@@ -138,8 +136,8 @@ public:
     unsigned events = 0;
     unsigned expectations = 0;
     unsigned skipped = 0;
-    const bool layer;                   // the portable layer's test control is there
-    std::pair<size_t, size_t> eventCalls;  // the layer's journal entries of the last event
+    const bool layer;                        // the portable layer's test control is there
+    std::pair<size_t, size_t> eventCalls;    // the layer's journal entries of the last event
     std::optional<std::u16string> sentence;  // what the last `show` line printed
     LayerChanges layerChanges;
 

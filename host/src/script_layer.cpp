@@ -168,9 +168,9 @@ void run(Session& session, const Step& step, const Version& line) {
 
 void run(Session& session, const Step& step, const Handles& line) {
     size_t open = w32test::openHandleCount();
-    session.checked(step, unless(open == line.count,
-                                 std::to_string(line.count) + " registry handles open",
-                                 std::to_string(open)));
+    session.checked(
+        step, unless(open == line.count, std::to_string(line.count) + " registry handles open",
+                     std::to_string(open)));
 }
 
 // Counts the calls of the last event, or checks that every one carried the mask.
@@ -187,10 +187,10 @@ void run(Session& session, const Step& step, const Calls& line) {
     }
     std::string why;
     if (!line.mask)
-        why = unless(masks.size() == line.number,
-                     std::to_string(line.number) + " calls of " + line.function +
-                         " in the last event",
-                     std::to_string(masks.size()));
+        why = unless(
+            masks.size() == line.number,
+            std::to_string(line.number) + " calls of " + line.function + " in the last event",
+            std::to_string(masks.size()));
     if (line.mask && masks.empty())
         why = "expected calls of " + line.function + ", the last event made none";
     for (size_t i = 0; line.mask && i < masks.size() && why.empty(); ++i)

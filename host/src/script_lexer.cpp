@@ -7,13 +7,9 @@ namespace hv::script {
 
 namespace {
 
-bool isBlank(char c) {
-    return c == ' ' || c == '\t';
-}
+bool isBlank(char c) { return c == ' ' || c == '\t'; }
 
-bool isHex(char c) {
-    return std::isxdigit(static_cast<unsigned char>(c)) != 0;
-}
+bool isHex(char c) { return std::isxdigit(static_cast<unsigned char>(c)) != 0; }
 
 // Resolves the escape after a backslash at `pos`.
 void escape(const std::string& line, size_t& pos, std::u16string& text) {
@@ -225,9 +221,7 @@ std::string hexList(const std::vector<uint8_t>& bytes) {
     return "[" + out + "]";
 }
 
-const char* rootKeyName(uint32_t index) {
-    return index < 5 ? RootNames[index] : "";
-}
+const char* rootKeyName(uint32_t index) { return index < 5 ? RootNames[index] : ""; }
 
 HKEY rootKeyHandle(uint32_t index) {
     static const HKEY Roots[] = {HKEY_CLASSES_ROOT, HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER,

@@ -130,8 +130,8 @@ ParseResult parse(const std::string& file, const std::string& text) {
         result.script.steps.push_back(std::move(step));
     }
     if (block.line)
-        result.error = file + ":" + std::to_string(block.line) + ": " + block.guard +
-                       " { is not closed";
+        result.error =
+            file + ":" + std::to_string(block.line) + ": " + block.guard + " { is not closed";
     return result;
 }
 

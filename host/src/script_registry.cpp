@@ -15,9 +15,7 @@ using Form = Registry::Form;
 const char* const FormNames[] = {"key create",   "key delete", "value set",
                                  "value delete", "expect key", "expect value"};
 
-std::string formName(Form form) {
-    return FormNames[static_cast<size_t>(form)];
-}
+std::string formName(Form form) { return FormNames[static_cast<size_t>(form)]; }
 
 struct TypeName {
     const char* word;  // as scripts write it

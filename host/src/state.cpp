@@ -16,8 +16,8 @@ const size_t HeaderBytes = 12;
 
 // Calls SaveRunObject or LoadRunObject with a handle on the file that the host opens for it and
 // closes after; -1, and why in `error`, when the file cannot be opened.
-int runState(Module& module, const char* entry, void* record, const std::string& path,
-             bool writing, std::string* error) {
+int runState(Module& module, const char* entry, void* record, const std::string& path, bool writing,
+             std::string* error) {
     auto call = module.entry<StateEntry>(entry);
     HANDLE file = CreateFileW(wide(fromUtf8(path)), writing ? GENERIC_WRITE : GENERIC_READ,
                               FILE_SHARE_READ, nullptr, writing ? CREATE_ALWAYS : OPEN_EXISTING,
@@ -72,7 +72,8 @@ bool readSavedState(const std::vector<uint8_t>& b, SavedState& state, std::strin
     state.version = u32At(b, 0);
     state.rootKeyIndex = u32At(b, 4);
     state.lastError = u32At(b, 8);
-    if (state.version != 1) return refuse("format version " + std::to_string(state.version) + ", not 1");
+    if (state.version != 1)
+        return refuse("format version " + std::to_string(state.version) + ", not 1");
     if (b.size() < HeaderBytes + 2) return refuse("the key byte length is missing");
     size_t keyBytes = b[12] | b[13] << 8;
     size_t end = HeaderBytes + 2 + keyBytes;
@@ -80,11 +81,13 @@ bool readSavedState(const std::vector<uint8_t>& b, SavedState& state, std::strin
     if (b.size() < end)
         return refuse("the key text is cut short (" + std::to_string(b.size() - HeaderBytes - 2) +
                       " of " + std::to_string(keyBytes) + " bytes)");
-    if (b.size() > end) return refuse("bytes after the record (" + std::to_string(b.size() - end) + ")");
+    if (b.size() > end)
+        return refuse("bytes after the record (" + std::to_string(b.size() - end) + ")");
     state.hasKey = keyBytes != 0;
     state.key.clear();
     if (!state.hasKey) return true;
-    if (b[end - 1] != 0 || b[end - 2] != 0) return refuse("the key text lacks its terminating zero");
+    if (b[end - 1] != 0 || b[end - 2] != 0)
+        return refuse("the key text lacks its terminating zero");
     for (size_t at = HeaderBytes + 2; at + 2 <= end; at += 2) {
         char16_t unit = static_cast<char16_t>(b[at] | b[at + 1] << 8);
         if (unit == 0) break;

@@ -26,6 +26,7 @@ const short ReturnsInteger = 0;
 // EventInfo entries: menuId, stringId, code, flags, paramCount, the parameter types, then the
 // parameter titles. Entries follow each other without gaps, in code order; the editor sees each
 // entry from its code on.
+// clang-format off
 constexpr short ConditionInfoTable[] = {
     IDM_CND_KEY_EXISTS, IDS_CND_KEY_EXISTS, 0, ConditionFlags, 2,
         ParamRootKey, ParamText, IDS_TITLE_ROOT_KEY, IDS_TITLE_KEY_NAME,
@@ -84,6 +85,7 @@ constexpr short ExpressionInfoTable[] = {
     IDM_EXP_LAST_ERROR_CODE, IDS_EXP_LAST_ERROR_CODE, 6, ReturnsInteger, 0,
     IDM_EXP_LAST_ERROR_MESSAGE, IDS_EXP_LAST_ERROR_MESSAGE, 7, ReturnsText, 0,
 };
+// clang-format on
 
 // Word positions inside an entry.
 const int MenuIdWord = 0;
@@ -244,8 +246,8 @@ void DisplayText(const EditorStructure* editor, const Catalogue& catalogue, Host
 }
 
 // A parameter's title: its string, or the event's menu text for a title of 0.
-void LoadParameterTitle(const Catalogue& catalogue, HostValue code, HostValue index,
-                        LPWSTR buffer, HostValue capacity) {
+void LoadParameterTitle(const Catalogue& catalogue, HostValue code, HostValue index, LPWSTR buffer,
+                        HostValue capacity) {
     short title = 0;
     if (!ParamTitle(catalogue, code, index, &title)) return;
     int room = static_cast<WORD>(capacity);
@@ -297,8 +299,8 @@ HV_EXPORT void WINAPI GetConditionString(const EditorStructure* editor, HostValu
                                          LPWSTR buffer, HostValue capacity) {
     DisplayText(editor, Conditions, code, buffer, capacity);
 }
-HV_EXPORT void WINAPI GetActionString(const EditorStructure* editor, HostValue code,
-                                      LPWSTR buffer, HostValue capacity) {
+HV_EXPORT void WINAPI GetActionString(const EditorStructure* editor, HostValue code, LPWSTR buffer,
+                                      HostValue capacity) {
     DisplayText(editor, Actions, code, buffer, capacity);
 }
 HV_EXPORT void WINAPI GetExpressionString(const EditorStructure* editor, HostValue code,

@@ -12,8 +12,8 @@ const WCHAR HelpFileName[] = TEXT("Help\\Hivelet.chm");
 // A property table that holds no property: its first entry is the all-zero end mark.
 const BYTE EmptyPropertyList[24] = {};
 
-const DWORD MinimumBuild = 242;             // low 12 bits of the version word
-const DWORD MinimumVersion = 0x02000000;    // high 16 bits
+const DWORD MinimumBuild = 242;           // low 12 bits of the version word
+const DWORD MinimumVersion = 0x02000000;  // high 16 bits
 
 }  // namespace
 
@@ -41,8 +41,8 @@ HV_EXPORT DWORD WINAPI GetInfos(HostValue code) {
     }
 }
 
-HV_EXPORT void WINAPI GetObjInfos(HostValue, HostValue, LPWSTR name, LPWSTR maker,
-                                  LPWSTR copyright, LPWSTR description, LPWSTR webSite) {
+HV_EXPORT void WINAPI GetObjInfos(HostValue, HostValue, LPWSTR name, LPWSTR maker, LPWSTR copyright,
+                                  LPWSTR description, LPWSTR webSite) {
     LoadStringW(moduleInstance, IDS_OBJECT_NAME, name, 255);
     LoadStringW(moduleInstance, IDS_MAKER, maker, 255);
     LoadStringW(moduleInstance, IDS_COPYRIGHT, copyright, 255);

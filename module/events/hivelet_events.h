@@ -8,11 +8,11 @@
 // the module's internals.
 #pragma once
 
-#define HV_CONDITIONS(EVENT)             \
-    EVENT(0, CndKeyExists, 2)            \
-    EVENT(1, CndValueExists, 3)          \
-    EVENT(2, CndCurrentKeyExists, 0)     \
-    EVENT(3, CndCurrentValueExists, 1)   \
+#define HV_CONDITIONS(EVENT)           \
+    EVENT(0, CndKeyExists, 2)          \
+    EVENT(1, CndValueExists, 3)        \
+    EVENT(2, CndCurrentKeyExists, 0)   \
+    EVENT(3, CndCurrentValueExists, 1) \
     EVENT(4, CndLastActionSuccessful, 0)
 
 #define HV_ACTIONS(EVENT)              \
@@ -30,12 +30,12 @@
     EVENT(11, ActCreateKey, 2)         \
     EVENT(12, ActSet64BitMode, 1)
 
-#define HV_EXPRESSIONS(EVENT)           \
-    EVENT(0, ExpGetCurrentRootKey, 0)   \
-    EVENT(1, ExpGetCurrentKey, 0)       \
-    EVENT(2, ExpGetCurrentDword, 1)     \
-    EVENT(3, ExpGetCurrentString, 1)    \
-    EVENT(4, ExpGetDword, 3)            \
-    EVENT(5, ExpGetString, 3)           \
-    EVENT(6, ExpLastErrorCode, 0)       \
+#define HV_EXPRESSIONS(EVENT)         \
+    EVENT(0, ExpGetCurrentRootKey, 0) \
+    EVENT(1, ExpGetCurrentKey, 0)     \
+    EVENT(2, ExpGetCurrentDword, 1)   \
+    EVENT(3, ExpGetCurrentString, 1)  \
+    EVENT(4, ExpGetDword, 3)          \
+    EVENT(5, ExpGetString, 3)         \
+    EVENT(6, ExpLastErrorCode, 0)     \
     EVENT(7, ExpLastErrorMessage, 0)

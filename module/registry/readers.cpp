@@ -12,8 +12,8 @@ namespace {
 // leaves the high bytes of the result zero, not undefined.
 LONG ReadDword(RunObjectData* instance, HKEY key, const WCHAR* name) {
     DWORD value = 0, type = 0, size = sizeof(value);
-    LONG result = RegQueryValueExW(key, name, nullptr, &type, reinterpret_cast<BYTE*>(&value),
-                                   &size);
+    LONG result =
+        RegQueryValueExW(key, name, nullptr, &type, reinterpret_cast<BYTE*>(&value), &size);
     instance->lastError = static_cast<DWORD>(result);
     DWORD read = 0;
     if (result == ERROR_SUCCESS) {

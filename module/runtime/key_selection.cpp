@@ -8,7 +8,8 @@
 #include "host_services.h"
 #include "routines.h"
 
-#define ROOT(name) {TEXT(#name), name, sizeof(#name) - 1}
+#define ROOT(name) \
+    { TEXT(#name), name, sizeof(#name) - 1 }
 const RootKey RootKeyTable[RootKeyCount + 1] = {
     ROOT(HKEY_CLASSES_ROOT),   ROOT(HKEY_LOCAL_MACHINE), ROOT(HKEY_CURRENT_USER),
     ROOT(HKEY_CURRENT_CONFIG), ROOT(HKEY_USERS),         {nullptr, nullptr, 0},

@@ -24,8 +24,7 @@ struct RunObjectData;
 typedef LPWSTR(WINAPI* GetStringBufferService)(RunObjectData* instance, int zero, int bytes);
 typedef HostValue(WINAPI* ExpressionParameterService)(RunObjectData* instance, int one,
                                                       HostValue hostValue);
-typedef HostValue(WINAPI* GetNextParameterService)(RunObjectData* instance, int allBits,
-                                                   int zero);
+typedef HostValue(WINAPI* GetNextParameterService)(RunObjectData* instance, int allBits, int zero);
 
 // The host's run header: only the four services the module calls.
 struct RunHeader {
@@ -57,8 +56,7 @@ struct RunObjectData {
     DWORD use64BitView;
 };
 
-typedef LONG(WINAPI* ConditionRoutine)(RunObjectData* instance, HostValue param1,
-                                       HostValue param2);
+typedef LONG(WINAPI* ConditionRoutine)(RunObjectData* instance, HostValue param1, HostValue param2);
 typedef short(WINAPI* ActionRoutine)(RunObjectData* instance, HostValue param1, HostValue param2);
 typedef HostValue(WINAPI* ExpressionRoutine)(RunObjectData* instance, HostValue hostValue);
 
@@ -81,7 +79,7 @@ struct RunObjectInfos {
 
 // A root-key parameter as the host stores it in event data.
 struct RootKeyParam {
-    WORD size;       // 16 for a new parameter; never read
+    WORD size;  // 16 for a new parameter; never read
     BYTE hostOwned[4];
     BYTE rootIndex[4];  // u32, little-endian, not aligned
 };
@@ -120,8 +118,7 @@ static_assert(offsetof(EditorStructure, insertProperties) == ByPointerSize(340, 
 static_assert(offsetof(RunObjectInfos, conditions) == 0, "conditions");
 static_assert(offsetof(RunObjectInfos, actions) == ByPointerSize(4, 8), "actions");
 static_assert(offsetof(RunObjectInfos, expressions) == ByPointerSize(8, 16), "expressions");
-static_assert(offsetof(RunObjectInfos, conditionCount) == ByPointerSize(12, 24),
-              "condition count");
+static_assert(offsetof(RunObjectInfos, conditionCount) == ByPointerSize(12, 24), "condition count");
 static_assert(offsetof(RunObjectInfos, actionCount) == ByPointerSize(14, 26), "action count");
 static_assert(offsetof(RunObjectInfos, expressionCount) == ByPointerSize(16, 28),
               "expression count");

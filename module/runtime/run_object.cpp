@@ -35,9 +35,7 @@ const DWORD ObjectIdentifier = 'H' << 24 | 'V' << 16 | 'L' << 8 | 'T';
 
 }  // namespace
 
-HV_EXPORT short WINAPI GetRunObjectDataSize(HostValue, HostValue) {
-    return sizeof(RunObjectData);
-}
+HV_EXPORT short WINAPI GetRunObjectDataSize(HostValue, HostValue) { return sizeof(RunObjectData); }
 
 HV_EXPORT short WINAPI CreateRunObject(RunObjectData* instance, HostValue, HostValue) {
     instance->rootKeyIndex = 0;

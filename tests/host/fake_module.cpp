@@ -58,12 +58,8 @@ Slot textResult(void* record, const void* text) {
 }
 
 // Conditions.
-LONG WINAPI ReturnFirst(void*, Slot a, Slot) {
-    return static_cast<LONG>(a);
-}
-LONG WINAPI ReturnSecond(void*, Slot, Slot b) {
-    return static_cast<LONG>(b);
-}
+LONG WINAPI ReturnFirst(void*, Slot a, Slot) { return static_cast<LONG>(a); }
+LONG WINAPI ReturnSecond(void*, Slot, Slot b) { return static_cast<LONG>(b); }
 // Fetches as many parameters as its first argument says, and answers the last one.
 LONG WINAPI FetchCount(void* record, Slot count, Slot) {
     Slot last = 0;
@@ -104,9 +100,7 @@ short WINAPI WriteTextParam(void*, Slot text, Slot) {
     reinterpret_cast<uint8_t*>(text)[0] ^= 1;
     return 0;
 }
-short WINAPI ReturnMinusTwo(void*, Slot, Slot) {
-    return -2;
-}
+short WINAPI ReturnMinusTwo(void*, Slot, Slot) { return -2; }
 
 // Expressions.
 Slot WINAPI OverrunBuffer(void* record, Slot) {
@@ -130,15 +124,9 @@ Slot WINAPI OverFetch(void* record, Slot host) {
     next(record, host);
     return 0;
 }
-Slot WINAPI WrongHostValue(void* record, Slot host) {
-    return first(record, 1, host + 1);
-}
-Slot WINAPI ReturnHostValue(void*, Slot host) {
-    return host;
-}
-Slot WINAPI NullText(void* record, Slot) {
-    return textResult(record, nullptr);
-}
+Slot WINAPI WrongHostValue(void* record, Slot host) { return first(record, 1, host + 1); }
+Slot WINAPI ReturnHostValue(void*, Slot host) { return host; }
+Slot WINAPI NullText(void* record, Slot) { return textResult(record, nullptr); }
 Slot WINAPI UnderrunBuffer(void* record, Slot) {
     auto* buffer = static_cast<uint8_t*>(borrow(record, 4));
     buffer[-1] = 0;
@@ -171,18 +159,14 @@ const void* const Expressions[] = {reinterpret_cast<const void*>(OverrunBuffer),
 
 }  // namespace
 
-FAKE_EXPORT short WINAPI GetRunObjectDataSize(Slot, Slot) {
-    return RecordSize;
-}
+FAKE_EXPORT short WINAPI GetRunObjectDataSize(Slot, Slot) { return RecordSize; }
 
 FAKE_EXPORT short WINAPI CreateRunObject(void* record, Slot, Slot) {
     memset(static_cast<uint8_t*>(record) + 184, 0, RecordSize - 184);
     return 0;
 }
 
-FAKE_EXPORT short WINAPI DestroyRunObject(void*, Slot) {
-    return 0;
-}
+FAKE_EXPORT short WINAPI DestroyRunObject(void*, Slot) { return 0; }
 
 // The variant without GetRunObjectInfos offers its tables under a name the host never asks for.
 #ifdef FAKE_WITHOUT_INFOS

@@ -138,9 +138,7 @@ std::vector<Fault> faults() {
     };
 }
 
-void PrintTo(const Fault& f, std::ostream* os) {
-    *os << hv::kindName(f.kind) << " " << f.code;
-}
+void PrintTo(const Fault& f, std::ostream* os) { *os << hv::kindName(f.kind) << " " << f.code; }
 
 class HostFault : public testing::TestWithParam<Fault> {};
 

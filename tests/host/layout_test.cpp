@@ -21,9 +21,7 @@ const Expected HostOffsets[] = {
      24, 336, 344, 0,   8,   16,  {24, 26, 28}, 37,  40,  46},
 };
 
-void PrintTo(const Expected& e, std::ostream* os) {
-    *os << e.pointer * 8 << "-bit";
-}
+void PrintTo(const Expected& e, std::ostream* os) { *os << e.pointer * 8 << "-bit"; }
 
 class Layout : public testing::TestWithParam<Expected> {};
 

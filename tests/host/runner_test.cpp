@@ -7,6 +7,8 @@
 #include <sstream>
 #include <stdexcept>
 
+// The scripts below keep one script line per source line, as a script file would show them.
+// clang-format off
 namespace {
 
 hv::Module& hivelet() {

@@ -512,9 +512,7 @@ const Malformed MalformedLines[] = {
 };
 
 // Keeps the quotes and backslashes of a row out of the generated test names.
-void PrintTo(const Malformed&, std::ostream* os) {
-    *os << "row";
-}
+void PrintTo(const Malformed&, std::ostream* os) { *os << "row"; }
 
 class MalformedLine : public testing::TestWithParam<Malformed> {};
 

@@ -78,10 +78,9 @@ TEST_P(OwnMessages, ModuleCodesHaveTheirOwnTexts) {
 
 INSTANTIATE_TEST_SUITE_P(
     Codes, OwnMessages,
-    ::testing::Values(
-        OwnMessage{40, u"Invalid parameters."},
-        OwnMessage{41, u"The value you try to read from is not a DWORD value."},
-        OwnMessage{42, u"The value you try to read from is not a string value."}));
+    ::testing::Values(OwnMessage{40, u"Invalid parameters."},
+                      OwnMessage{41, u"The value you try to read from is not a DWORD value."},
+                      OwnMessage{42, u"The value you try to read from is not a string value."}));
 
 TEST_F(ErrorState, SystemCodesGetTheSystemsTextWithItsLineEnd) {
     for (const SystemText& row : SystemTexts) {

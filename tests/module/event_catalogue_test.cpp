@@ -36,6 +36,7 @@ const Param ArgRootKey = {3, 1000, u"Root key"};
 const Param ArgKeyName = {3, 1001, u"Key name"};
 const Param ArgValueName = {3, 1002, u"Value name"};
 
+// clang-format off
 const std::vector<Event> Conditions = {
     {0, 26000, u"Key exists", 6000, u"%o: key %0\\%1 exists", 0x0220, {RootKey, KeyName}},
     {1, 26001, u"Value exists", 6001, u"%o: value %2 of key %0\\%1 exists", 0x0220,
@@ -78,6 +79,7 @@ const std::vector<Event> Expressions = {
     {6, 27006, u"Last error code", 7006, u"RegErrCode(", 0, {}},
     {7, 27007, u"Last error message", 7007, u"RegErrText$(", 1, {}},
 };
+// clang-format on
 
 const std::pair<EventKind, const std::vector<Event>*> Kinds[] = {
     {EventKind::Condition, &Conditions},
@@ -125,10 +127,9 @@ TEST_F(Catalogue, EveryEntryHasItsWordsAndTexts) {
             SCOPED_TRACE(std::string(hv::kindName(kind)) + " " + std::to_string(e.code));
             const int16_t* words = catalogue.infos(kind, e.code);
             ASSERT_NE(words, nullptr);
-            std::vector<int16_t> expected = {static_cast<int16_t>(e.menuId),
-                                             static_cast<int16_t>(e.stringId),
-                                             static_cast<int16_t>(e.code), e.flags,
-                                             static_cast<int16_t>(e.params.size())};
+            std::vector<int16_t> expected = {
+                static_cast<int16_t>(e.menuId), static_cast<int16_t>(e.stringId),
+                static_cast<int16_t>(e.code), e.flags, static_cast<int16_t>(e.params.size())};
             for (const Param& p : e.params) expected.push_back(p.type);
             for (const Param& p : e.params) expected.push_back(p.titleId);
             EXPECT_EQ(std::vector<int16_t>(words - 2, words - 2 + expected.size()), expected);
@@ -203,33 +204,48 @@ TEST_F(Catalogue, TablesMenusAndRoutinesAgree) {
 
 TEST_F(Catalogue, MenusHaveTheirExactStructure) {
     EXPECT_EQ(menuLines(EventKind::Action),
-              (std::vector<std::string>{
-                  "Current Key >", "  Set Current Root Key 25000", "  Set Current Key 25001", "  -",
-                  "  Create Current Key 25010", "  -", "  Set DWORD Value 25002",
-                  "  Set String Value 25003", "  -", "  Delete Current Key 25006",
-                  "  Delete Value 25007", "Any Key >", "  Create Key 25011", "  -",
-                  "  Set DWORD Value 25004", "  Set String Value 25005", "  -",
-                  "  Delete Key 25008", "  Delete Value 25009", "Set 64-bit mode 25012"}));
+              (std::vector<std::string>{"Current Key >",
+                                        "  Set Current Root Key 25000",
+                                        "  Set Current Key 25001",
+                                        "  -",
+                                        "  Create Current Key 25010",
+                                        "  -",
+                                        "  Set DWORD Value 25002",
+                                        "  Set String Value 25003",
+                                        "  -",
+                                        "  Delete Current Key 25006",
+                                        "  Delete Value 25007",
+                                        "Any Key >",
+                                        "  Create Key 25011",
+                                        "  -",
+                                        "  Set DWORD Value 25004",
+                                        "  Set String Value 25005",
+                                        "  -",
+                                        "  Delete Key 25008",
+                                        "  Delete Value 25009",
+                                        "Set 64-bit mode 25012"}));
     EXPECT_EQ(menuLines(EventKind::Condition),
-              (std::vector<std::string>{"Current key exists 26002",
-                                        "Value exists in current key 26003", "-",
-                                        "Key exists 26000", "Value exists 26001", "-",
-                                        "Last action successful 26004"}));
+              (std::vector<std::string>{
+                  "Current key exists 26002", "Value exists in current key 26003", "-",
+                  "Key exists 26000", "Value exists 26001", "-", "Last action successful 26004"}));
     EXPECT_EQ(menuLines(EventKind::Expression),
               (std::vector<std::string>{"Current Key >", "  Get Current Root Key 27000",
-                                        "  Get Current Key 27001", "  -",
-                                        "  Get DWORD Value 27002", "  Get String Value 27003",
-                                        "Any Key >", "  Get DWORD Value 27004",
-                                        "  Get String Value 27005", "-", "Last error code 27006",
-                                        "Last error message 27007"}));
+                                        "  Get Current Key 27001", "  -", "  Get DWORD Value 27002",
+                                        "  Get String Value 27003", "Any Key >",
+                                        "  Get DWORD Value 27004", "  Get String Value 27005", "-",
+                                        "Last error code 27006", "Last error message 27007"}));
 }
 
 TEST_F(Catalogue, CodesFromForeignIdentifiers) {
     const std::tuple<EventKind, uint32_t, int> table[] = {
-        {EventKind::Action, 25012, 12},           {EventKind::Condition, 26004, 4},
-        {EventKind::Condition, 25000, -1},        {EventKind::Expression, 0, -1},
-        {EventKind::Action, 25013, -1},           {EventKind::Expression, 27008, -1},
-        {EventKind::Action, 0xFFFF, -1},          {EventKind::Action, 0x10000 + 25012, 12},
+        {EventKind::Action, 25012, 12},
+        {EventKind::Condition, 26004, 4},
+        {EventKind::Condition, 25000, -1},
+        {EventKind::Expression, 0, -1},
+        {EventKind::Action, 25013, -1},
+        {EventKind::Expression, 27008, -1},
+        {EventKind::Action, 0xFFFF, -1},
+        {EventKind::Action, 0x10000 + 25012, 12},
         {EventKind::Expression, 0xABCD0000 + 27007, 7}};
     for (auto [kind, id, code] : table)
         EXPECT_EQ(catalogue.codeFromMenu(kind, id), code) << hv::kindName(kind) << " " << id;
@@ -307,7 +323,8 @@ TEST_F(Catalogue, NothingOutsideTheTables) {
     void* ed = editor.structure();
     for (auto [kind, events] : Kinds) {
         Slot past = static_cast<Slot>(events->size());
-        for (Slot code : {past, Slot{-1}, Slot{0x7FFF}}) EXPECT_EQ(catalogue.infos(kind, static_cast<int>(code)), nullptr);
+        for (Slot code : {past, Slot{-1}, Slot{0x7FFF}})
+            EXPECT_EQ(catalogue.infos(kind, static_cast<int>(code)), nullptr);
         // Only the low 16 bits of a code count.
         EXPECT_EQ(catalogue.infos(kind, 0x10000), catalogue.infos(kind, 0));
     }
@@ -356,8 +373,8 @@ TEST_F(Catalogue, MenusLeaveOnlyTheirPopupAlive) {
     EXPECT_TRUE(w32test::liveMenus().empty());
 
     const std::pair<const char*, unsigned> faults[] = {
-        {"LoadMenuW", 1}, {"CreatePopupMenu", 1}, {"CreatePopupMenu", 2},
-        {"CreatePopupMenu", 3}, {"AppendMenuW", 1}, {"AppendMenuW", 12}};
+        {"LoadMenuW", 1},       {"CreatePopupMenu", 1}, {"CreatePopupMenu", 2},
+        {"CreatePopupMenu", 3}, {"AppendMenuW", 1},     {"AppendMenuW", 12}};
     for (auto [function, nth] : faults) {
         w32test::failCall(function, nth, 8);
         EXPECT_EQ(catalogue.menu(EventKind::Action), nullptr) << function << " " << nth;
@@ -368,7 +385,7 @@ TEST_F(Catalogue, MenusLeaveOnlyTheirPopupAlive) {
     hvtest::Guarded<char16_t> buffer(64);
     typedef void(WINAPI * TitleFn)(void*, Slot, Slot, LPWSTR, Slot);
     hvtest::module().entry<TitleFn>("GetActionTitle")(editor.structure(), 2, 1,
-                                                       hvtest::wide(buffer.data()), 64);
+                                                      hvtest::wide(buffer.data()), 64);
     EXPECT_TRUE(buffer.untouched());
 }
 #endif

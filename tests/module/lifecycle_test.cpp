@@ -113,14 +113,13 @@ TEST(Lifecycle, EveryRoutineHasTheHostsCallingShape) {
     hv::Instance instance(hvtest::module());
     const auto& t = hvtest::module().tables();
     for (size_t code = 0; code < t.conditions.size(); ++code) {
-        auto r = instance.condition(static_cast<int>(code), {hv::Param::null(), hv::Param::null(),
-                                                             hv::Param::null()});
+        auto r = instance.condition(static_cast<int>(code),
+                                    {hv::Param::null(), hv::Param::null(), hv::Param::null()});
         EXPECT_TRUE(r.asCondition() == 0 || r.asCondition() == 1) << "condition " << code;
     }
     for (size_t code = 0; code < t.actions.size(); ++code) {
-        auto r = instance.action(static_cast<int>(code),
-                                 {hv::Param::null(), hv::Param::null(), hv::Param::null(),
-                                  hv::Param::null()});
+        auto r = instance.action(static_cast<int>(code), {hv::Param::null(), hv::Param::null(),
+                                                          hv::Param::null(), hv::Param::null()});
         EXPECT_EQ(r.asAction(), 0) << "action " << code;
         EXPECT_TRUE(r.sentinelsIntact) << r.damage;
     }

@@ -9,9 +9,9 @@ using hv::Slot;
 TEST(ModuleEntry, InfoCodesAnswerTheirConstants) {
     typedef DWORD(WINAPI * Fn)(Slot);
     auto getInfos = hvtest::module().entry<Fn>("GetInfos");
-    const std::pair<Slot, DWORD> table[] = {{0, 0x300}, {1, 0},  {2, 0x100}, {3, 0},
-                                            {4, 0},     {5, 0},  {6, 2},     {7, 292},
-                                            {8, 1},     {9, 0},  {0xFFFFFFFF, 0}};
+    const std::pair<Slot, DWORD> table[] = {{0, 0x300}, {1, 0}, {2, 0x100},     {3, 0},
+                                            {4, 0},     {5, 0}, {6, 2},         {7, 292},
+                                            {8, 1},     {9, 0}, {0xFFFFFFFF, 0}};
     for (auto [code, value] : table) EXPECT_EQ(getInfos(code), value) << "code " << code;
 }
 
@@ -51,11 +51,9 @@ TEST(ModuleEntry, ObjectRectIs32By32FromItsCorner) {
 TEST(ModuleEntry, IdentityStringsFillTheirBuffers) {
     typedef void(WINAPI * Fn)(Slot, Slot, LPWSTR, LPWSTR, LPWSTR, LPWSTR, LPWSTR);
     hvtest::Guarded<char16_t> name(255), maker(255), copyright(255), description(1024), web(255);
-    hvtest::module().entry<Fn>("GetObjInfos")(0, 0, hvtest::wide(name.data()),
-                                               hvtest::wide(maker.data()),
-                                               hvtest::wide(copyright.data()),
-                                               hvtest::wide(description.data()),
-                                               hvtest::wide(web.data()));
+    hvtest::module().entry<Fn>("GetObjInfos")(
+        0, 0, hvtest::wide(name.data()), hvtest::wide(maker.data()), hvtest::wide(copyright.data()),
+        hvtest::wide(description.data()), hvtest::wide(web.data()));
     EXPECT_EQ(std::u16string(name.data()), u"Hivelet");
     EXPECT_EQ(std::u16string(description.data()),
               u"The Hivelet object allows you to retrieve or write values from or to the "
@@ -127,14 +125,13 @@ INSTANTIATE_TEST_SUITE_P(
         Inert{"UsesFile", 2, 0}, Inert{"GetTextCaps", 2, 0}, Inert{"GetTextAlignment", 2, 0},
         Inert{"GetTextClr", 2, 0}, Inert{"UpdateEditStructure", 2, 0}, Inert{"StartApp", 2, -1},
         Inert{"EndApp", 2, -1}, Inert{"GetPropValue", 3, 0}, Inert{"GetPropCheck", 3, 0},
-        Inert{"GetPropCreateParam", 3, 0}, Inert{"EditProp", 3, 0},
-        Inert{"IsPropEnabled", 3, 1}, Inert{"UnloadObject", 3, -1},
-        Inert{"PrepareToWriteObject", 3, -1}, Inert{"CreateFromFile", 3, -1},
-        Inert{"DuplicateObject", 3, -1}, Inert{"SetTextAlignment", 3, -1},
-        Inert{"SetTextClr", 3, -1}, Inert{"StartFrame", 3, -1}, Inert{"EndFrame", 3, -1},
-        Inert{"ReleaseProperties", 3, -1}, Inert{"LoadObject", 4, 0}, Inert{"GetFilters", 4, 0},
-        Inert{"SetTextFont", 4, 1}, Inert{"PutObject", 4, -1}, Inert{"RemoveObject", 4, -1},
-        Inert{"UpdateFileNames", 4, -1}, Inert{"SetPropValue", 4, -1},
+        Inert{"GetPropCreateParam", 3, 0}, Inert{"EditProp", 3, 0}, Inert{"IsPropEnabled", 3, 1},
+        Inert{"UnloadObject", 3, -1}, Inert{"PrepareToWriteObject", 3, -1},
+        Inert{"CreateFromFile", 3, -1}, Inert{"DuplicateObject", 3, -1},
+        Inert{"SetTextAlignment", 3, -1}, Inert{"SetTextClr", 3, -1}, Inert{"StartFrame", 3, -1},
+        Inert{"EndFrame", 3, -1}, Inert{"ReleaseProperties", 3, -1}, Inert{"LoadObject", 4, 0},
+        Inert{"GetFilters", 4, 0}, Inert{"SetTextFont", 4, 1}, Inert{"PutObject", 4, -1},
+        Inert{"RemoveObject", 4, -1}, Inert{"UpdateFileNames", 4, -1}, Inert{"SetPropValue", 4, -1},
         Inert{"SetPropCheck", 4, -1}, Inert{"ReleasePropCreateParam", 4, -1},
         Inert{"GetTextFont", 5, 1}, Inert{"IsTransparent", 5, 0}),
     [](const ::testing::TestParamInfo<Inert>& p) { return std::string(p.param.name); });

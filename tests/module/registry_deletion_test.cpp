@@ -14,8 +14,8 @@ namespace {
 
 using Keys = std::vector<std::u16string>;
 // The tree at K in the order the walk deletes it: deepest first, always the first subkey.
-const Keys Tree = {u"K\\A\\A1", u"K\\A", u"K\\B\\B1", u"K\\B\\B2\\B2x", u"K\\B\\B2", u"K\\B",
-                   u"K\\C", u"K"};
+const Keys Tree = {u"K\\A\\A1", u"K\\A", u"K\\B\\B1", u"K\\B\\B2\\B2x",
+                   u"K\\B\\B2", u"K\\B", u"K\\C",     u"K"};
 
 class RegistryDeletion : public RegistryFixture {
 protected:
@@ -36,7 +36,8 @@ protected:
     }
 };
 
-class RegistryDeletionOrder : public RegistryDeletion, public ::testing::WithParamInterface<bool> {};
+class RegistryDeletionOrder : public RegistryDeletion,
+                              public ::testing::WithParamInterface<bool> {};
 
 // Making the n-th deletion fail shows the order: the keys before it are gone, the rest stay.
 TEST_P(RegistryDeletionOrder, DeepestFirstAndAFailureStopsTheWalk) {

@@ -28,8 +28,7 @@ std::string keyCalls(const std::vector<w32test::Call>& journal) {
     return out;
 }
 
-class RegistryStandardRun : public RegistryFixture,
-                            public ::testing::WithParamInterface<ViewCase> {
+class RegistryStandardRun : public RegistryFixture, public ::testing::WithParamInterface<ViewCase> {
 protected:
     const Op& op = ops()[std::get<0>(GetParam())];
     const bool view = std::get<1>(GetParam());

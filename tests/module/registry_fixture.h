@@ -38,9 +38,21 @@ using hv::Param;
 using Bytes = std::vector<BYTE>;
 
 enum { KeyExists, ValueExists, CurrentKeyExists, CurrentValueExists, LastActionSuccessful };
-enum { SetRootKey, SetCurrentKey, SetCurrentDword, SetCurrentString, SetDword, SetString,
-       DeleteCurrentKey, DeleteCurrentValue, DeleteKey, DeleteValue, CreateCurrentKey, CreateKey,
-       Set64BitMode };
+enum {
+    SetRootKey,
+    SetCurrentKey,
+    SetCurrentDword,
+    SetCurrentString,
+    SetDword,
+    SetString,
+    DeleteCurrentKey,
+    DeleteCurrentValue,
+    DeleteKey,
+    DeleteValue,
+    CreateCurrentKey,
+    CreateKey,
+    Set64BitMode
+};
 enum { GetCurrentKey = 1, GetCurrentDword, GetCurrentString, GetDword, GetString };
 
 constexpr bool Layer = HV_HAS_TEST_CONTROL;  // the portable layer, with journal and faults
@@ -98,7 +110,12 @@ inline const std::vector<Op>& ops() {
         {"ExpGetCurrentDword", E, GetCurrentDword, G::DwordReader, {A::Name}, false, u"d"},
         {"ExpGetCurrentString", E, GetCurrentString, G::StringReader, {A::Name}, false, u"s"},
         {"ExpGetDword", E, GetDword, G::DwordReader, {A::RootName, A::Path, A::Name}, false, u"d"},
-        {"ExpGetString", E, GetString, G::StringReader, {A::RootName, A::Path, A::Name}, false,
+        {"ExpGetString",
+         E,
+         GetString,
+         G::StringReader,
+         {A::RootName, A::Path, A::Name},
+         false,
          u"s"},
         {"ActSetCurrentDword", X, SetCurrentDword, G::Writer, {A::Name, A::Dword}, false, u"d"},
         {"ActSetCurrentString", X, SetCurrentString, G::Writer, {A::Name, A::Text}, false, u"s"},
@@ -144,8 +161,8 @@ protected:
         name_ = u"HiveletTests";
 #if !HV_HAS_TEST_CONTROL
         const auto* test = ::testing::UnitTest::GetInstance()->current_test_info();
-        for (char c : "-" + std::to_string(GetCurrentProcessId()) + "-" +
-                          test->test_suite_name() + "." + test->name())
+        for (char c : "-" + std::to_string(GetCurrentProcessId()) + "-" + test->test_suite_name() +
+                          "." + test->name())
             name_ += c == '/' ? u'_' : char16_t(c);
         base_ = u"Software\\" + name_;
         makeKey(CurrentUser, base_);
@@ -169,7 +186,8 @@ protected:
     static HKEY created(HKEY root, const std::u16string& path, REGSAM view = 0) {
         HKEY key = nullptr;
         EXPECT_EQ(RegCreateKeyExW(root, wstr(path), 0, nullptr, 0, KEY_ALL_ACCESS | view, nullptr,
-                                  &key, nullptr), 0);
+                                  &key, nullptr),
+                  0);
         return key;
     }
     static void makeKey(HKEY root, const std::u16string& path) { RegCloseKey(created(root, path)); }
@@ -188,7 +206,8 @@ protected:
         LONG code = RegOpenKeyExW(root, wstr(path), 0, KEY_QUERY_VALUE | view, &key);
         if (!code) code = RegQueryValueExW(key, wstr(name), nullptr, &type, nullptr, &size);
         Bytes data(code ? 0 : size);
-        if (!code && size) code = RegQueryValueExW(key, wstr(name), nullptr, &type, data.data(), &size);
+        if (!code && size)
+            code = RegQueryValueExW(key, wstr(name), nullptr, &type, data.data(), &size);
         if (key && key != root) RegCloseKey(key);
         return shown(code, type, code ? Bytes() : data);
     }
@@ -260,7 +279,9 @@ protected:
         }
         return p;
     }
-    hv::Outcome runOp(const Op& op, const std::vector<Param>& p) { return run(op.kind, op.code, p); }
+    hv::Outcome runOp(const Op& op, const std::vector<Param>& p) {
+        return run(op.kind, op.code, p);
+    }
 
     // Expressions fetch every argument; conditions and actions only where the table says so.
     static void expectFetches(const Op& op, const hv::Outcome& o) {

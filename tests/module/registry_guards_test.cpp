@@ -13,7 +13,9 @@ struct Guard {
     const char16_t* name = nullptr;  // RootName
 };
 const char* const GuardNames[] = {"Null", "RootIndex", "RootName", "NoCurrentKey", "CurrentRoot"};
-void PrintTo(const Guard& g, std::ostream* os) { *os << ops()[g.op].routine << " " << GuardNames[g.what]; }
+void PrintTo(const Guard& g, std::ostream* os) {
+    *os << ops()[g.op].routine << " " << GuardNames[g.what];
+}
 std::string guardName(const ::testing::TestParamInfo<Guard>& row) {
     return ops()[row.param.op].routine + ("_" + std::string(GuardNames[row.param.what])) + "_" +
            std::to_string(row.index);

@@ -83,8 +83,10 @@ TEST_F(RegistryViews, DefaultViewWritesLandUnderWow6432Node) {
     view64(true);
     EXPECT_EQ(dword(u"v"), 0);
     EXPECT_EQ(instance.lastError(), 2u);
-    EXPECT_EQ(expr(GetDword, {Param::str(RootNames[MachineIndex]), Param::str(wow6432()),
-                              text(u"v")}).asInteger(), 32);
+    EXPECT_EQ(
+        expr(GetDword, {Param::str(RootNames[MachineIndex]), Param::str(wow6432()), text(u"v")})
+            .asInteger(),
+        32);
     EXPECT_EQ(cond(KeyExists, {root(), Param::str(wow6432())}).asCondition(), 1);
     EXPECT_EQ(cond(KeyExists, {root(), key()}).asCondition(), 0);
 }

@@ -26,7 +26,7 @@ protected:
 TEST_F(RootKeyParam, InitWritesOnlyTheSizeAndTheIndex) {
     param.fillRecord(0xFF);
     param.init();
-    const std::vector<uint8_t> expected = {0x10, 0x00, 0xFF, 0xFF, 0xFF, 0xFF, 0, 0,
+    const std::vector<uint8_t> expected = {0x10, 0x00, 0xFF, 0xFF, 0xFF, 0xFF, 0,    0,
                                            0,    0,    0xFF, 0xFF, 0xFF, 0xFF, 0xFF, 0xFF};
     EXPECT_EQ(param.recordBytes(), expected);
     EXPECT_TRUE(param.recordIntact());
@@ -50,10 +50,17 @@ TEST_F(RootKeyParam, DialogOutcomes) {
         {"change, Escape", 1, {UserStep::select(3), UserStep::escape()}, 0, 1, {true, false}},
         {"change, close box", 0, {UserStep::select(2), UserStep::closeBox()}, 0, 0, {true, false}},
         {"change, Enter", 0, {UserStep::select(3), UserStep::enter()}, 1, 3, {true, false}},
-        {"double click only selects", 0,
-         {UserStep::doubleClick(4), UserStep::ok()}, 1, 4, {true, false}},
-        {"index 7, OK waits for a name", 7,
-         {UserStep::ok(), UserStep::enter(), UserStep::select(1), UserStep::ok()}, 1, 1,
+        {"double click only selects",
+         0,
+         {UserStep::doubleClick(4), UserStep::ok()},
+         1,
+         4,
+         {true, false}},
+        {"index 7, OK waits for a name",
+         7,
+         {UserStep::ok(), UserStep::enter(), UserStep::select(1), UserStep::ok()},
+         1,
+         1,
          {true, true, true, false}},
     };
     for (const EditCase& c : cases) {
@@ -134,11 +141,13 @@ TEST_F(RootKeyParam, DialogKeepsTheIndexAddressAndAddsTheNames) {
     ASSERT_EQ(sets.size(), 1u);
     EXPECT_EQ(sets[0].args[1], static_cast<uint64_t>(sizeof(void*) == 4 ? 8 : 16));
     // Signed values are journaled sign-extended; an address is compared at its own width.
-    EXPECT_EQ(static_cast<uintptr_t>(sets[0].args[2]), reinterpret_cast<uintptr_t>(param.record() + 6));
+    EXPECT_EQ(static_cast<uintptr_t>(sets[0].args[2]),
+              reinterpret_cast<uintptr_t>(param.record() + 6));
     std::vector<std::u16string> added;
     for (const w32test::Call& c : w32test::callsOf("SendMessageW"))
         if (c.args[1] == LB_ADDSTRING)
-            added.push_back(hvtest::text(reinterpret_cast<const WCHAR*>(static_cast<uintptr_t>(c.args[3]))));
+            added.push_back(
+                hvtest::text(reinterpret_cast<const WCHAR*>(static_cast<uintptr_t>(c.args[3]))));
     EXPECT_EQ(added, RootNames);
 #endif
 }
@@ -165,9 +174,13 @@ TEST_F(RootKeyParam, SmallCapacitiesAndInvalidIndices) {
         hv::Slot capacity;
         std::u16string text;
     } cases[] = {
-        {3, 1, u""},          {3, 5, u"HKEY"},  {3, 19, u"HKEY_CURRENT_CONFI"},
-        {3, 20, u"HKEY_CURRENT_CONFIG"},        {1, 18, u"HKEY_LOCAL_MACHIN"},
-        {1, 19, u"HKEY_LOCAL_MACHINE"},         {3, 0x10005, u"HKEY"},
+        {3, 1, u""},
+        {3, 5, u"HKEY"},
+        {3, 19, u"HKEY_CURRENT_CONFI"},
+        {3, 20, u"HKEY_CURRENT_CONFIG"},
+        {1, 18, u"HKEY_LOCAL_MACHIN"},
+        {1, 19, u"HKEY_LOCAL_MACHINE"},
+        {3, 0x10005, u"HKEY"},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.capacity);
@@ -177,8 +190,9 @@ TEST_F(RootKeyParam, SmallCapacitiesAndInvalidIndices) {
         EXPECT_EQ(t.written.back(), 0);
         EXPECT_TRUE(t.intact);
     }
-    const std::pair<uint32_t, hv::Slot> nothing[] = {
-        {1, 0}, {1, -1}, {1, 0xFFFF}, {1, 0x8000}, {1, 0x10000}, {5, 64}, {7, 64}, {0xFFFFFFFF, 64}};
+    const std::pair<uint32_t, hv::Slot> nothing[] = {{1, 0},      {1, -1},         {1, 0xFFFF},
+                                                     {1, 0x8000}, {1, 0x10000},    {5, 64},
+                                                     {7, 64},     {0xFFFFFFFF, 64}};
     for (auto [index, capacity] : nothing) {
         SCOPED_TRACE(capacity);
         param.setRecord(index);

@@ -110,8 +110,11 @@ TEST(SavedState, SavesTheExactBytes) {
         const char16_t* key;
         size_t size;
     } rows[] = {
-        {2, 0, nullptr, 14}, {2, 0, u"Software", 32}, {2, 0, u"", 16},
-        {9, 2, u"A\\B", 22},  {0xFFFFFFFF, 0x80070005, nullptr, 14},
+        {2, 0, nullptr, 14},
+        {2, 0, u"Software", 32},
+        {2, 0, u"", 16},
+        {9, 2, u"A\\B", 22},
+        {0xFFFFFFFF, 0x80070005, nullptr, 14},
     };
     for (const auto& row : rows) {
         SCOPED_TRACE(hvtest::show(row.key ? row.key : u"<null>"));
@@ -249,7 +252,8 @@ TEST_F(FileFaults, WriteFailsOrWritesNothingAtEachStep) {
     const size_t sizes[] = {12, 2, 16};
     for (bool silent : {false, true}) {
         for (unsigned nth = 1; nth <= 3; ++nth) {
-            SCOPED_TRACE(std::string(silent ? "silent" : "failed") + " write " + std::to_string(nth));
+            SCOPED_TRACE(std::string(silent ? "silent" : "failed") + " write " +
+                         std::to_string(nth));
             w32test::clearJournal();
             if (silent)
                 w32test::silentWrite(nth);

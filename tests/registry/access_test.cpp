@@ -30,12 +30,13 @@ TEST_P(RegistryMasks, EachOperationChecksItsRight) {
     RegCloseKey(key);
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Masks, RegistryMasks,
-    ::testing::Values(MaskCase{KEY_READ, 0, 5, 0, 5}, MaskCase{0x20119, 0, 5, 0, 5},
-                      MaskCase{KEY_WRITE, 5, 0, 5, 2}, MaskCase{KEY_QUERY_VALUE, 0, 5, 5, 5},
-                      MaskCase{TreeWalk, 5, 5, 0, 5}, MaskCase{0, 5, 5, 5, 5},
-                      MaskCase{KEY_ALL_ACCESS, 0, 0, 0, 2}));
+INSTANTIATE_TEST_SUITE_P(Masks, RegistryMasks,
+                         ::testing::Values(MaskCase{KEY_READ, 0, 5, 0, 5},
+                                           MaskCase{0x20119, 0, 5, 0, 5},
+                                           MaskCase{KEY_WRITE, 5, 0, 5, 2},
+                                           MaskCase{KEY_QUERY_VALUE, 0, 5, 5, 5},
+                                           MaskCase{TreeWalk, 5, 5, 0, 5}, MaskCase{0, 5, 5, 5, 5},
+                                           MaskCase{KEY_ALL_ACCESS, 0, 0, 0, 2}));
 
 TEST_F(RegistryAccess, HandlesToADeletedKeyStayStaleEvenAfterItsPathReturns) {
     HKEY stale = create(user, TEXT("Gone"));
@@ -74,7 +75,8 @@ TEST_F(RegistryAccess, DeniedRightsRefuseOpeningDeletingAndNewChildren) {
     EXPECT_EQ(probe(CurrentUser, TEXT("Locked"), KEY_READ | View64), 0);
     EXPECT_EQ(tryCreate(CurrentUser, TEXT("Locked\\Child"), KEY_READ), 5);
     EXPECT_EQ(RegDeleteKeyW(CurrentUser, TEXT("Locked")), 5);
-    w32test::denyAccess(CurrentUser, TEXT(""), KEY_SET_VALUE);  // on a root: the predefined handle too
+    w32test::denyAccess(CurrentUser, TEXT(""),
+                        KEY_SET_VALUE);  // on a root: the predefined handle too
     EXPECT_EQ(setDword(CurrentUser, TEXT("v"), 1), 5);
     w32test::denyAccess(CurrentUser, TEXT("Locked"), 0);
     EXPECT_EQ(RegDeleteKeyW(CurrentUser, TEXT("Locked")), 0);
@@ -88,8 +90,9 @@ TEST_F(RegistryAccess, InjectedFaultsChangeNothingAndCallsAreJournaled) {
     size_t open = w32test::openHandleCount();
     w32test::failCall("RegCreateKeyExW", 1, 1450);
     HKEY key = reinterpret_cast<HKEY>(1);
-    EXPECT_EQ(RegCreateKeyExW(CurrentUser, TEXT("F"), 0, nullptr, 0, 0xF013F, nullptr, &key, nullptr),
-              1450);
+    EXPECT_EQ(
+        RegCreateKeyExW(CurrentUser, TEXT("F"), 0, nullptr, 0, 0xF013F, nullptr, &key, nullptr),
+        1450);
     EXPECT_EQ(key, nullptr);
     EXPECT_EQ(probe(CurrentUser, TEXT("F")), 2);
     key = create(CurrentUser, TEXT("F"));

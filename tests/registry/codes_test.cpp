@@ -44,6 +44,7 @@ TEST_P(RegistryCodes, CallGivesWindowsCode) {
     EXPECT_EQ(row.call(scene), row.code) << row.what;
 }
 
+// clang-format off
 #define CALL(call) +[](const Scene& s) -> LONG {       \
     [[maybe_unused]] HKEY u = s.u, k = s.k, r = s.r;   \
     return call;                                       \
@@ -54,6 +55,7 @@ TEST_P(RegistryCodes, CallGivesWindowsCode) {
 #define WINE_ROW(why, what, code, call) Row{what, LONG(code), CALL(call), why, false}
 // A row whose call Wine does not survive; Windows' answer is recorded nowhere: the layer's.
 #define CRASH_ROW(why, what, code, call) Row{what, LONG(code), CALL(call), why, true}
+// clang-format on
 
 const HKEY Bogus = reinterpret_cast<HKEY>(uintptr_t(0xdeadbee0));
 const HKEY UndefinedRoot = reinterpret_cast<HKEY>(uintptr_t(0x80000010));
@@ -64,8 +66,8 @@ WString chars(size_t n) { return WString(n, TEXT('n')); }
 
 LONG createWith(HKEY key, DWORD options) {
     HKEY out = nullptr;
-    LONG code = RegCreateKeyExW(key, TEXT("N"), 0, nullptr, options, KEY_READ, nullptr, &out,
-                                nullptr);
+    LONG code =
+        RegCreateKeyExW(key, TEXT("N"), 0, nullptr, options, KEY_READ, nullptr, &out, nullptr);
     RegCloseKey(out);
     return code;
 }
@@ -115,8 +117,8 @@ INSTANTIATE_TEST_SUITE_P(
         ROW("open without out handle", 87, RegOpenKeyExW(k, TEXT("Child"), 0, KEY_READ, nullptr)),
         ROW("create, undefined option bit", 0, createWith(k, 0x80)),
         CRASH_ROW(NullPointer, "create without out handle", 87,
-                 RegCreateKeyExW(k, TEXT("N"), 0, nullptr, 0, KEY_READ, nullptr, nullptr,
-                                 nullptr)),
+                  RegCreateKeyExW(k, TEXT("N"), 0, nullptr, 0, KEY_READ, nullptr, nullptr,
+                                  nullptr)),
         ROW("value name of 16383", 0, setDword(k, chars(16383).c_str(), 1)),
         ROW("value name of 16384", 87, setDword(k, chars(16384).c_str(), 1)),
         ROW("backslash in a value name", 0, setDword(k, TEXT("a\\b/c"), 1)),
@@ -139,18 +141,19 @@ INSTANTIATE_TEST_SUITE_P(
 // Windows refuses to delete a key with subkeys (5); the parent handle's rights do not matter.
 INSTANTIATE_TEST_SUITE_P(
     Deletion, RegistryCodes,
-    ::testing::Values(
-        ROW("key with subkeys", 5, RegDeleteKeyW(k, TEXT("Child"))),
-        ROW("own key with subkeys", 5, RegDeleteKeyW(k, TEXT(""))),
-        ROW("leaf in other case", 0, RegDeleteKeyW(u, TEXT("scene\\CHILD\\grandchild\\"))),
-        ROW("through a KEY_READ parent", 0, RegDeleteKeyW(r, TEXT("Empty"))),
-        ROW("leading backslash", 161, RegDeleteKeyW(u, TEXT("\\Scene\\Empty"))),
-        ROW("missing", 2, RegDeleteKeyW(k, TEXT("None"))),
-        ROW("NULL subkey", 87, RegDeleteKeyW(k, nullptr)),
-        ROW("NULL handle", 6, RegDeleteKeyW(nullptr, TEXT("Scene"))),
-        ROW("Ex, other bits, Reserved 1", 0, RegDeleteKeyExW(k, TEXT("Empty"), KEY_READ | View64, 1)),
-        ROW("HKCU itself", 5, RegDeleteKeyW(CurrentUser, TEXT(""))),
-        ROW("HKCC itself", 5, RegDeleteKeyW(HKEY_CURRENT_CONFIG, TEXT(""))),
-        ROW("HKU through a handle", 5, deleteThroughNewHandle(HKEY_USERS))));
+    ::testing::Values(ROW("key with subkeys", 5, RegDeleteKeyW(k, TEXT("Child"))),
+                      ROW("own key with subkeys", 5, RegDeleteKeyW(k, TEXT(""))),
+                      ROW("leaf in other case", 0,
+                          RegDeleteKeyW(u, TEXT("scene\\CHILD\\grandchild\\"))),
+                      ROW("through a KEY_READ parent", 0, RegDeleteKeyW(r, TEXT("Empty"))),
+                      ROW("leading backslash", 161, RegDeleteKeyW(u, TEXT("\\Scene\\Empty"))),
+                      ROW("missing", 2, RegDeleteKeyW(k, TEXT("None"))),
+                      ROW("NULL subkey", 87, RegDeleteKeyW(k, nullptr)),
+                      ROW("NULL handle", 6, RegDeleteKeyW(nullptr, TEXT("Scene"))),
+                      ROW("Ex, other bits, Reserved 1", 0,
+                          RegDeleteKeyExW(k, TEXT("Empty"), KEY_READ | View64, 1)),
+                      ROW("HKCU itself", 5, RegDeleteKeyW(CurrentUser, TEXT(""))),
+                      ROW("HKCC itself", 5, RegDeleteKeyW(HKEY_CURRENT_CONFIG, TEXT(""))),
+                      ROW("HKU through a handle", 5, deleteThroughNewHandle(HKEY_USERS))));
 
 }  // namespace

@@ -8,7 +8,8 @@ namespace {
 using RegistryKeys = RegistryTest;
 
 TEST_F(RegistryKeys, PredefinedRootsOpenAsThemselvesButCreateNewHandles) {
-    for (HKEY root : {HKEY_CLASSES_ROOT, CurrentUser, LocalMachine, HKEY_USERS, HKEY_CURRENT_CONFIG}) {
+    for (HKEY root :
+         {HKEY_CLASSES_ROOT, CurrentUser, LocalMachine, HKEY_USERS, HKEY_CURRENT_CONFIG}) {
         HKEY same = nullptr, alsoSame = nullptr;
         EXPECT_EQ(RegOpenKeyExW(root, TEXT(""), 0, KEY_READ, &same), 0);
         EXPECT_EQ(RegOpenKeyExW(root, nullptr, 0, KEY_READ, &alsoSame), 0);
@@ -47,9 +48,8 @@ TEST_F(RegistryKeys, CreatingTheKeyItselfOpensIt) {
     for (const WCHAR* path : {TEXT(""), static_cast<const WCHAR*>(nullptr)}) {
         DWORD disposition = 0;
         HKEY same = nullptr;
-        EXPECT_EQ(RegCreateKeyExW(user, path, 0, nullptr, 0, KEY_READ, nullptr, &same,
-                                  &disposition),
-                  0);
+        EXPECT_EQ(
+            RegCreateKeyExW(user, path, 0, nullptr, 0, KEY_READ, nullptr, &same, &disposition), 0);
         EXPECT_EQ(disposition, DWORD(REG_OPENED_EXISTING_KEY));
         RegCloseKey(same);
     }

@@ -57,7 +57,9 @@ void RegistryTest::SetUp() {
     userPath = UserBase + (TEXT("\\") + name);
     machinePath = MachineBase + (TEXT("\\") + name);
     // Left over by a run that did not finish, the scratch keys go first.
-    owned_ = {{CurrentUser, userPath, 0}, {LocalMachine, machinePath, View32}, {LocalMachine, machinePath, View64}};
+    owned_ = {{CurrentUser, userPath, 0},
+              {LocalMachine, machinePath, View32},
+              {LocalMachine, machinePath, View64}};
     for (const Owned& o : owned_) remove(o.root, o.path, o.view);
     user = create(CurrentUser, userPath);
 }

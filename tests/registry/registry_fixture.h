@@ -19,8 +19,7 @@ const HKEY LocalMachine = HKEY_LOCAL_MACHINE;
 inline LONG tryCreate(HKEY root, const WString& path, REGSAM sam = KEY_ALL_ACCESS,
                       DWORD* disposition = nullptr) {
     HKEY key = nullptr;
-    LONG code =
-        RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, sam, nullptr, &key, disposition);
+    LONG code = RegCreateKeyExW(root, path.c_str(), 0, nullptr, 0, sam, nullptr, &key, disposition);
     if (key) RegCloseKey(key);
     return code;
 }

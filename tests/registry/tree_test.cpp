@@ -36,24 +36,24 @@ TEST_P(RegistryEnumName, WritesTheNameOnlyWithItsTerminator) {
     RegCloseKey(key);
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Capacities, RegistryEnumName,
-    ::testing::Values(EnumCase{0, 0, 234}, EnumCase{0, 5, 234}, EnumCase{0, 10, 234},
-                      EnumCase{0, 11, 0}, EnumCase{0, 16, 0}, EnumCase{1, 16, 259},
-                      EnumCase{0xFFFFFFFF, 16, 259}));
+INSTANTIATE_TEST_SUITE_P(Capacities, RegistryEnumName,
+                         ::testing::Values(EnumCase{0, 0, 234}, EnumCase{0, 5, 234},
+                                           EnumCase{0, 10, 234}, EnumCase{0, 11, 0},
+                                           EnumCase{0, 16, 0}, EnumCase{1, 16, 259},
+                                           EnumCase{0xFFFFFFFF, 16, 259}));
 
 // Windows documents no order, but a hive keeps each key's subkey list sorted by the names'
 // upper case (so '_' comes after the letters), and enumeration follows that list.
 TEST_F(RegistryTree, EnumerationIsInCaseInsensitiveOrder) {
     HV_WINE_DIFFERS("Wine orders subkeys by their lower case, '_' before the letters");
     HKEY key = create(user, TEXT("Order"));
-    const WCHAR* names[] = {TEXT("c"),  TEXT("B2"), TEXT("a b"), TEXT("10"),
-                            TEXT("Z"),  TEXT("_u"), TEXT("aa"),  TEXT("9"),
-                            TEXT("b"),  TEXT("A"),  TEXT("\u00C9E2"), TEXT("\u00E9e")};
+    const WCHAR* names[] = {TEXT("c"), TEXT("B2"), TEXT("a b"),      TEXT("10"),
+                            TEXT("Z"), TEXT("_u"), TEXT("aa"),       TEXT("9"),
+                            TEXT("b"), TEXT("A"),  TEXT("\u00C9E2"), TEXT("\u00E9e")};
     for (const WCHAR* name : names) make(key, name);
     const std::vector<WString> expected = {
-        TEXT("10"), TEXT("9"),  TEXT("A"), TEXT("a b"), TEXT("aa"),      TEXT("b"),
-        TEXT("B2"), TEXT("c"),  TEXT("Z"), TEXT("_u"),  TEXT("\u00E9e"), TEXT("\u00C9E2")};
+        TEXT("10"), TEXT("9"), TEXT("A"), TEXT("a b"), TEXT("aa"),      TEXT("b"),
+        TEXT("B2"), TEXT("c"), TEXT("Z"), TEXT("_u"),  TEXT("\u00E9e"), TEXT("\u00C9E2")};
     std::vector<WString> seen;
     for (DWORD i = 0; i < expected.size(); ++i) seen.push_back(subkeyAt(key, i));
     EXPECT_EQ(seen, expected);

@@ -41,8 +41,8 @@ TEST_P(RegistryVersionSize, OnlyTheRecordSizesAreAccepted) {
 
 INSTANTIATE_TEST_SUITE_P(Sizes, RegistryVersionSize,
                          ::testing::Values(SizeCase{276, TRUE}, SizeCase{0, FALSE},
-                                           SizeCase{275, FALSE},
-                                           SizeCase{277, FALSE}, SizeCase{0xFFFFFFFF, FALSE}));
+                                           SizeCase{275, FALSE}, SizeCase{277, FALSE},
+                                           SizeCase{0xFFFFFFFF, FALSE}));
 
 // What Windows 8.1 and later tell a program without a compatibility manifest.
 TEST_F(RegistryPlatform, AProgramWithoutManifestIsToldWindows8) {

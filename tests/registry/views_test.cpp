@@ -94,18 +94,18 @@ const char* const WineRedirectsClasses =
 
 INSTANTIATE_TEST_SUITE_P(
     Views, RegistrySharedKeys,
-    ::testing::Values(
-        ViewCase{TEXT("Classes"), nullptr, 0, WineRedirectsClasses},
-        ViewCase{TEXT("Classes\\CLSID"), nullptr, 2},
-        ViewCase{TEXT("Clients"), nullptr, 0, WineLinksMicrosoftClients},
-        ViewCase{TEXT("Policies"), nullptr, 0},
-        ViewCase{TEXT("RegisteredApplications"), nullptr, 0, WineHasNoLink},
-        ViewCase{TEXT("Microsoft\\OLE"), nullptr, 0},
-        ViewCase{TEXT("Microsoft\\Windows NT\\CurrentVersion\\Fonts"), nullptr, 0},
-        ViewCase{TEXT("Microsoft\\Windows\\CurrentVersion\\App Paths"), nullptr, 0},
-        ViewCase{TEXT("Microsoft\\Windows\\CurrentVersion\\Run"), nullptr, 2},
-        ViewCase{TEXT("Microsoft"), TEXT("OLE Hivelet"), 2},  // shared is OLE, not a prefix
-        ViewCase{TEXT(""), TEXT("Classes Hivelet"), 2}));
+    ::testing::Values(ViewCase{TEXT("Classes"), nullptr, 0, WineRedirectsClasses},
+                      ViewCase{TEXT("Classes\\CLSID"), nullptr, 2},
+                      ViewCase{TEXT("Clients"), nullptr, 0, WineLinksMicrosoftClients},
+                      ViewCase{TEXT("Policies"), nullptr, 0},
+                      ViewCase{TEXT("RegisteredApplications"), nullptr, 0, WineHasNoLink},
+                      ViewCase{TEXT("Microsoft\\OLE"), nullptr, 0},
+                      ViewCase{TEXT("Microsoft\\Windows NT\\CurrentVersion\\Fonts"), nullptr, 0},
+                      ViewCase{TEXT("Microsoft\\Windows\\CurrentVersion\\App Paths"), nullptr, 0},
+                      ViewCase{TEXT("Microsoft\\Windows\\CurrentVersion\\Run"), nullptr, 2},
+                      ViewCase{TEXT("Microsoft"), TEXT("OLE Hivelet"),
+                               2},  // shared is OLE, not a prefix
+                      ViewCase{TEXT(""), TEXT("Classes Hivelet"), 2}));
 
 // A handle stands for one copy; paths below it are redirected by the flag of each call.
 TEST_F(RegistryViews, WalksFromAHandleUseTheFlagOfTheCall) {
@@ -154,12 +154,12 @@ TEST_P(RegistrySharedRoots, KeysAreTheSameInBothViews) {
     EXPECT_EQ(probe(c.root, parent + TEXT("Wow6432Node\\") + id, KEY_READ | View64), 2);
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Roots, RegistrySharedRoots,
-    ::testing::Values(RootCase{CurrentUser, TEXT("Software")},
-                      RootCase{HKEY_CLASSES_ROOT, TEXT(""), WineRedirectsClasses},
-                      RootCase{HKEY_USERS, TEXT(".DEFAULT\\Software")},
-                      RootCase{HKEY_CURRENT_CONFIG, TEXT("Software")},
-                      RootCase{LocalMachine, TEXT("SYSTEM")}));
+INSTANTIATE_TEST_SUITE_P(Roots, RegistrySharedRoots,
+                         ::testing::Values(RootCase{CurrentUser, TEXT("Software")},
+                                           RootCase{HKEY_CLASSES_ROOT, TEXT(""),
+                                                    WineRedirectsClasses},
+                                           RootCase{HKEY_USERS, TEXT(".DEFAULT\\Software")},
+                                           RootCase{HKEY_CURRENT_CONFIG, TEXT("Software")},
+                                           RootCase{LocalMachine, TEXT("SYSTEM")}));
 
 }  // namespace

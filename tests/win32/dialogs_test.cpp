@@ -100,7 +100,8 @@ TEST_F(Dialogs, TemplateReaderAndItsBounds) {
     for (size_t cut = 0; cut + 3 < size; ++cut) {
         std::vector<BYTE> prefix(data, data + cut);
         EXPECT_EQ(w32::readDialogTemplate(prefix.data(), prefix.size(), &t),
-                  w32::TemplateStatus::Truncated) << cut;
+                  w32::TemplateStatus::Truncated)
+            << cut;
     }
     const BYTE extended[] = {1, 0, 0xFF, 0xFF, 0, 0, 0, 0};
     EXPECT_EQ(w32::readDialogTemplate(extended, sizeof extended, &t),
@@ -119,12 +120,15 @@ TEST_F(Dialogs, FailuresReturnMinusOneOrZeroAndCreateNothing) {
         {[] { return run(999); }, -1, ERROR_RESOURCE_NAME_NOT_FOUND},
         {[] { return DialogBoxParamW(module, TEXT("ROOT"), nullptr, testProc, 0); }, -1,
          ERROR_RESOURCE_NAME_NOT_FOUND},
-        {[] { return DialogBoxParamW(nullptr, MAKEINTRESOURCEW(101), nullptr, testProc, 0); },
-         -1, ERROR_RESOURCE_DATA_NOT_FOUND},
-        {[&] { return run(101, reinterpret_cast<HWND>(&dummy)); }, 0,
-         ERROR_INVALID_WINDOW_HANDLE},
+        {[] { return DialogBoxParamW(nullptr, MAKEINTRESOURCEW(101), nullptr, testProc, 0); }, -1,
+         ERROR_RESOURCE_DATA_NOT_FOUND},
+        {[&] { return run(101, reinterpret_cast<HWND>(&dummy)); }, 0, ERROR_INVALID_WINDOW_HANDLE},
 #if HV_OVER_LAYER
-        {[] { w32test::failCall("DialogBoxParamW", 1, 8); return run(); }, -1, 8},
+        {[] {
+             w32test::failCall("DialogBoxParamW", 1, 8);
+             return run();
+         },
+         -1, 8},
 #endif
     };
     for (size_t i = 0; i < std::size(cases); ++i) {
@@ -150,8 +154,8 @@ TEST_F(Dialogs, InitialisationUserSlotAndWindows) {
         EXPECT_EQ(GetDlgCtrlID(GetDlgItem(dialog, ListId)), ListId);
         EXPECT_EQ(GetParent(GetDlgItem(dialog, ListId)), dialog);
         HWND found = nullptr;  // the thread's one top-level window, where the walk stops
-        EXPECT_FALSE(EnumThreadWindows(GetCurrentThreadId(), firstWindow,
-                                       reinterpret_cast<LPARAM>(&found)));
+        EXPECT_FALSE(
+            EnumThreadWindows(GetCurrentThreadId(), firstWindow, reinterpret_cast<LPARAM>(&found)));
         EXPECT_EQ(found, dialog);
         EXPECT_NE(GetDlgItem(dialog, IDCANCEL), nullptr);
         EXPECT_EQ(GetDlgItem(dialog, 77), nullptr);
@@ -182,8 +186,9 @@ TEST_F(Dialogs, ListBoxFollowsWindowsSemantics) {
         const struct {
             WPARAM index;
             LRESULT result, selected;
-        } selections[] = {{2, 2, 2},  {WPARAM(-1), LB_ERR, LB_ERR}, {1, 1, 1},
-                          {3, LB_ERR, 1}, {0, 0, 0}, {99, LB_ERR, 0}};
+        } selections[] = {{2, 2, 2}, {WPARAM(-1), LB_ERR, LB_ERR},
+                          {1, 1, 1}, {3, LB_ERR, 1},
+                          {0, 0, 0}, {99, LB_ERR, 0}};
         for (auto [index, result, selected] : selections) {
             EXPECT_EQ(send(LB_SETCURSEL, index), result) << index;
             EXPECT_EQ(send(LB_GETCURSEL, 0), selected) << index;
@@ -210,12 +215,11 @@ TEST_F(Dialogs, ButtonsKeysAndCloseBox) {
     } cases[] = {
         {"BM_CLICK", [](HWND d) { SendMessageW(GetDlgItem(d, IDCANCEL), BM_CLICK, 0, 0); },
          IDCANCEL},
-        {"Enter on OK",
-         [](HWND d) { PostMessageW(GetDlgItem(d, IDOK), WM_KEYDOWN, VK_RETURN, 0); }, IDOK},
+        {"Enter on OK", [](HWND d) { PostMessageW(GetDlgItem(d, IDOK), WM_KEYDOWN, VK_RETURN, 0); },
+         IDOK},
         {"Enter on the list",  // the default button, not the control the key went to
          [](HWND d) { PostMessageW(GetDlgItem(d, ListId), WM_KEYDOWN, VK_RETURN, 0); }, IDOK},
-        {"Escape",
-         [](HWND d) { PostMessageW(GetDlgItem(d, ListId), WM_KEYDOWN, VK_ESCAPE, 0); },
+        {"Escape", [](HWND d) { PostMessageW(GetDlgItem(d, ListId), WM_KEYDOWN, VK_ESCAPE, 0); },
          IDCANCEL},
         {"close box", [](HWND d) { PostMessageW(d, WM_SYSCOMMAND, SC_CLOSE, 0); }, IDCANCEL},
         {"WM_CLOSE", [](HWND d) { SendMessageW(d, WM_CLOSE, 0, 0); }, IDCANCEL},

@@ -47,20 +47,18 @@ TEST_P(FormatMessages, WritesExactlyTheMessage) {
     buffer.expectHolds(c.written == Written::nothing ? nullptr : expected.c_str());
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Succeeding, FormatMessages,
-    testing::Values(
-        Format{2, Written::whole}, Format{1018, Written::whole},
-        Format{5, Written::whole, Unchanged, Fits}));
+INSTANTIATE_TEST_SUITE_P(Succeeding, FormatMessages,
+                         testing::Values(Format{2, Written::whole}, Format{1018, Written::whole},
+                                         Format{5, Written::whole, Unchanged, Fits}));
 
 INSTANTIATE_TEST_SUITE_P(
     Failing, FormatMessages,
-    testing::Values(
-        Format{40, Written::nothing, ERROR_MR_MID_NOT_FOUND}, Format{42, Written::nothing, 317},
-        Format{0x2000FFFF, Written::nothing, 317}, Format{0xFFFFFFFF, Written::nothing, 317},
-        Format{2, Written::nothing, ERROR_INSUFFICIENT_BUFFER, 0},
-        Format{2, Written::cut, ERROR_INSUFFICIENT_BUFFER, 10},
-        Format{5, Written::cut, ERROR_INSUFFICIENT_BUFFER, OneShort}));
+    testing::Values(Format{40, Written::nothing, ERROR_MR_MID_NOT_FOUND},
+                    Format{42, Written::nothing, 317}, Format{0x2000FFFF, Written::nothing, 317},
+                    Format{0xFFFFFFFF, Written::nothing, 317},
+                    Format{2, Written::nothing, ERROR_INSUFFICIENT_BUFFER, 0},
+                    Format{2, Written::cut, ERROR_INSUFFICIENT_BUFFER, 10},
+                    Format{5, Written::cut, ERROR_INSUFFICIENT_BUFFER, OneShort}));
 
 // A code's text is the same as its HRESULT's: the system looks the low word up.
 TEST(FormatMessageTexts, AnHresultOfTheWin32FacilityHasItsCodesText) {
@@ -70,9 +68,9 @@ TEST(FormatMessageTexts, AnHresultOfTheWin32FacilityHasItsCodesText) {
 // Every code the registry functions, the module's host or this layer may report has a text,
 // a sentence that ends in CR LF.
 TEST(FormatMessageTexts, CoverTheCodesInUse) {
-    for (DWORD code : {0, 2, 3, 5, 6, 8, 14, 87, 120, 122, 126, 127, 161, 234, 259, 998, 1010,
-                       1012, 1013, 1014, 1015, 1016, 1017, 1018, 1019, 1020, 1021, 1114, 1400,
-                       1812, 1813, 1814}) {
+    for (DWORD code : {0,    2,    3,    5,    6,    8,    14,   87,   120,  122,  126,
+                       127,  161,  234,  259,  998,  1010, 1012, 1013, 1014, 1015, 1016,
+                       1017, 1018, 1019, 1020, 1021, 1114, 1400, 1812, 1813, 1814}) {
         WString text = systemText(code);
         ASSERT_GT(text.size(), 3u) << code;
         EXPECT_EQ(text.substr(text.size() - 3), TEXT(".\r\n")) << code;
@@ -95,12 +93,12 @@ TEST(FormatMessageTexts, AreWindowsEnglishSentences) {
         {259, TEXT("No more data is available.")},
         // Inserts stay as they are.
         {317, TEXT("The system cannot find message text for message number 0x%1 in the message ")
-              TEXT("file for %2.")},
+                  TEXT("file for %2.")},
         {1010, TEXT("The configuration registry key is invalid.")},
         {1018, TEXT("Illegal operation attempted on a registry key that has been marked for ")
-               TEXT("deletion.")},
+                   TEXT("deletion.")},
         {1020, TEXT("Cannot create a symbolic link in a registry key that already has subkeys ")
-               TEXT("or values.")},
+                   TEXT("or values.")},
         {1021, TEXT("Cannot create a stable subkey under a volatile parent key.")}};
     for (const auto& [code, text] : texts)
         EXPECT_EQ(systemText(code), text + WString(TEXT("\r\n"))) << code;

@@ -56,8 +56,8 @@ INSTANTIATE_TEST_SUITE_P(
                     Load{1005, 64, 19, TEXT("Invalid parameters.")},
                     Load{1005, 20, 19, TEXT("Invalid parameters.")},
                     Load{1005, 19, 18, TEXT("Invalid parameters")},
-                    Load{1005, 10, 9, TEXT("Invalid p")},
-                    Load{1005, 2, 1, TEXT("I")}, Load{1005, 1, 0, nullptr},
+                    Load{1005, 10, 9, TEXT("Invalid p")}, Load{1005, 2, 1, TEXT("I")},
+                    Load{1005, 1, 0, nullptr},
                     Load{0x10000 + 1005, 64, 19, TEXT("Invalid parameters.")},  // ids are 16-bit
                     Load{1005, -1, 0, nullptr, Unchanged,
                          "a negative capacity gives capacity - 1, below the documented range"},

@@ -92,7 +92,7 @@ TEST_F(Menus, TemplateItemsByPositionAndByCommand) {
     EXPECT_EQ(GetMenuItemID(bar, 1), 13u);
     EXPECT_EQ(GetMenuItemID(bar, 2), 0xFFFFFFFFu);  // no such position
     ASSERT_EQ(GetMenuItemCount(file), 4);
-    EXPECT_EQ(GetMenuItemID(file, 1), 0u);          // separator
+    EXPECT_EQ(GetMenuItemID(file, 1), 0u);  // separator
     EXPECT_EQ(GetMenuState(file, 2, MF_BYPOSITION), (1u << 8) | MF_POPUP);
     EXPECT_EQ(GetMenuState(file, 3, MF_BYPOSITION), 0u);
     EXPECT_EQ(GetMenuState(file, 4, MF_BYPOSITION), 0xFFFFFFFFu);

@@ -166,9 +166,7 @@ TEST_P(DamagedImage, HasNoResources) {
     EXPECT_EQ(lookup(image, 6, 9), ResourceStatus::NoResources);
 }
 
-std::string damageName(const testing::TestParamInfo<Damage>& damage) {
-    return damage.param.name;
-}
+std::string damageName(const testing::TestParamInfo<Damage>& damage) { return damage.param.name; }
 
 INSTANTIATE_TEST_SUITE_P(Malformed, DamagedImage, testing::ValuesIn(Damages), damageName);
 

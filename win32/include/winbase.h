@@ -53,8 +53,8 @@ W32_API BOOL WINAPI FreeLibrary(HMODULE module);
 // System messages: English texts, inserts left as they are, into the caller's buffer.
 #define FORMAT_MESSAGE_IGNORE_INSERTS 0x00000200
 #define FORMAT_MESSAGE_FROM_SYSTEM 0x00001000
-W32_API DWORD WINAPI FormatMessageW(DWORD flags, LPCVOID source, DWORD messageId,
-                                    DWORD languageId, LPWSTR buffer, DWORD size, void* arguments);
+W32_API DWORD WINAPI FormatMessageW(DWORD flags, LPCVOID source, DWORD messageId, DWORD languageId,
+                                    LPWSTR buffer, DWORD size, void* arguments);
 
 // Synchronous files over POSIX descriptors: no overlapped I/O, no sharing modes enforced.
 #define INVALID_HANDLE_VALUE ((HANDLE)(LONG_PTR)-1)

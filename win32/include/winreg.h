@@ -50,19 +50,19 @@ typedef struct _FILETIME FILETIME, *PFILETIME;
 
 W32_API LSTATUS WINAPI RegOpenKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD ulOptions,
                                      REGSAM samDesired, PHKEY phkResult);
-W32_API LSTATUS WINAPI RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD Reserved,
-                                       LPWSTR lpClass, DWORD dwOptions, REGSAM samDesired,
-                                       LPSECURITY_ATTRIBUTES lpSecurityAttributes,
-                                       PHKEY phkResult, LPDWORD lpdwDisposition);
+W32_API LSTATUS WINAPI RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD Reserved, LPWSTR lpClass,
+                                       DWORD dwOptions, REGSAM samDesired,
+                                       LPSECURITY_ATTRIBUTES lpSecurityAttributes, PHKEY phkResult,
+                                       LPDWORD lpdwDisposition);
 W32_API LSTATUS WINAPI RegQueryValueExW(HKEY hKey, LPCWSTR lpValueName, LPDWORD lpReserved,
                                         LPDWORD lpType, LPBYTE lpData, LPDWORD lpcbData);
-W32_API LSTATUS WINAPI RegSetValueExW(HKEY hKey, LPCWSTR lpValueName, DWORD Reserved,
-                                      DWORD dwType, const BYTE* lpData, DWORD cbData);
+W32_API LSTATUS WINAPI RegSetValueExW(HKEY hKey, LPCWSTR lpValueName, DWORD Reserved, DWORD dwType,
+                                      const BYTE* lpData, DWORD cbData);
 W32_API LSTATUS WINAPI RegDeleteKeyW(HKEY hKey, LPCWSTR lpSubKey);
 W32_API LSTATUS WINAPI RegDeleteKeyExW(HKEY hKey, LPCWSTR lpSubKey, REGSAM samDesired,
                                        DWORD Reserved);
 W32_API LSTATUS WINAPI RegDeleteValueW(HKEY hKey, LPCWSTR lpValueName);
-W32_API LSTATUS WINAPI RegEnumKeyExW(HKEY hKey, DWORD dwIndex, LPWSTR lpName,
-                                     LPDWORD lpcchName, LPDWORD lpReserved, LPWSTR lpClass,
-                                     LPDWORD lpcchClass, PFILETIME lpftLastWriteTime);
+W32_API LSTATUS WINAPI RegEnumKeyExW(HKEY hKey, DWORD dwIndex, LPWSTR lpName, LPDWORD lpcchName,
+                                     LPDWORD lpReserved, LPWSTR lpClass, LPDWORD lpcchClass,
+                                     PFILETIME lpftLastWriteTime);
 W32_API LSTATUS WINAPI RegCloseKey(HKEY hKey);

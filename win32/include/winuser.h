@@ -20,8 +20,7 @@ W32_API BOOL WINAPI DestroyMenu(HMENU menu);
 W32_API HMENU WINAPI GetSubMenu(HMENU menu, int position);
 W32_API int WINAPI GetMenuItemCount(HMENU menu);
 W32_API UINT WINAPI GetMenuItemID(HMENU menu, int position);
-W32_API int WINAPI GetMenuStringW(HMENU menu, UINT item, LPWSTR buffer, int bufferMax,
-                                  UINT flags);
+W32_API int WINAPI GetMenuStringW(HMENU menu, UINT item, LPWSTR buffer, int bufferMax, UINT flags);
 W32_API UINT WINAPI GetMenuState(HMENU menu, UINT item, UINT flags);
 W32_API BOOL WINAPI AppendMenuW(HMENU menu, UINT flags, UINT_PTR idNewItem, LPCWSTR text);
 

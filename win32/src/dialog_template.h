@@ -28,7 +28,6 @@ struct DialogTemplate {
 enum class TemplateStatus { Ok, Truncated, Extended };
 
 // Reads a template at the start of `data` (which the resource image aligns to a DWORD).
-W32_INTERNAL TemplateStatus readDialogTemplate(const BYTE* data, size_t size,
-                                               DialogTemplate* out);
+W32_INTERNAL TemplateStatus readDialogTemplate(const BYTE* data, size_t size, DialogTemplate* out);
 
 }  // namespace w32

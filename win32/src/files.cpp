@@ -75,8 +75,8 @@ ssize_t transfer(Io io, int fd, Pointer buffer, size_t size) {
 // ReadFile and WriteFile. A test event "short <function>" withholds its count of bytes from the
 // transfer (all of them: a write that writes nothing); the call still succeeds.
 template <typename Io, typename Pointer>
-BOOL serveIo(const char* function, Io io, HANDLE handle, Pointer buffer, DWORD size,
-             LPDWORD count, LPOVERLAPPED overlapped) {
+BOOL serveIo(const char* function, Io io, HANDLE handle, Pointer buffer, DWORD size, LPDWORD count,
+             LPOVERLAPPED overlapped) {
     int fd = descriptorOf(handle);
     std::string event = std::string("short ") + function;
     auto withheld = static_cast<DWORD>(w32::takeFault(event).value_or(0));
@@ -91,8 +91,9 @@ BOOL serveIo(const char* function, Io io, HANDLE handle, Pointer buffer, DWORD s
     BOOL ok = n >= 0;
     *count = ok ? static_cast<DWORD>(n) : 0;
     if (!ok) SetLastError(code);
-    w32::record(function, {w32::arg(handle), w32::arg(buffer), size, w32::arg(count),
-                           w32::arg(overlapped)}, ok);
+    w32::record(function,
+                {w32::arg(handle), w32::arg(buffer), size, w32::arg(count), w32::arg(overlapped)},
+                ok);
     return ok;
 }
 

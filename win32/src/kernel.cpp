@@ -16,8 +16,8 @@ namespace {
 thread_local DWORD lastError = 0;
 
 struct LoadedLibrary {
-    void* dl;               // dlopen handle
-    bool system;            // one of the system libraries, served by this layer itself
+    void* dl;     // dlopen handle
+    bool system;  // one of the system libraries, served by this layer itself
     unsigned references;
     const BYTE* resources;  // compiled .res image, or null
     size_t resourceSize;

@@ -32,25 +32,30 @@ constexpr SystemMessage SystemMessages[] = {
     {161, u"The specified path is invalid."},
     {234, u"More data is available."},
     {259, u"No more data is available."},
-    {317, u"The system cannot find message text for message number 0x%1 in the message file for "
-          u"%2."},
+    {317,
+     u"The system cannot find message text for message number 0x%1 in the message file for "
+     u"%2."},
     {998, u"Invalid access to memory location."},
     {1009, u"The configuration registry database is corrupt."},
     {1010, u"The configuration registry key is invalid."},
     {1011, u"The configuration registry key could not be opened."},
     {1012, u"The configuration registry key could not be read."},
     {1013, u"The configuration registry key could not be written."},
-    {1014, u"One of the files in the registry database had to be recovered by use of a log or "
-           u"alternate copy. The recovery was successful."},
-    {1015, u"The registry is corrupted. The structure of one of the files containing registry "
-           u"data is corrupted, or the system's memory image of the file is corrupted, or the "
-           u"file could not be recovered because the alternate copy or log was absent or "
-           u"corrupted."},
-    {1016, u"An I/O operation initiated by the registry failed unrecoverably. The registry "
-           u"could not read in, or write out, or flush, one of the files that contain the "
-           u"system's image of the registry."},
-    {1017, u"The system has attempted to load or restore a file into the registry, but the "
-           u"specified file is not in a registry file format."},
+    {1014,
+     u"One of the files in the registry database had to be recovered by use of a log or "
+     u"alternate copy. The recovery was successful."},
+    {1015,
+     u"The registry is corrupted. The structure of one of the files containing registry "
+     u"data is corrupted, or the system's memory image of the file is corrupted, or the "
+     u"file could not be recovered because the alternate copy or log was absent or "
+     u"corrupted."},
+    {1016,
+     u"An I/O operation initiated by the registry failed unrecoverably. The registry "
+     u"could not read in, or write out, or flush, one of the files that contain the "
+     u"system's image of the registry."},
+    {1017,
+     u"The system has attempted to load or restore a file into the registry, but the "
+     u"specified file is not in a registry file format."},
     {1018, u"Illegal operation attempted on a registry key that has been marked for deletion."},
     {1019, u"System could not allocate the required space in a registry log."},
     {1020, u"Cannot create a symbolic link in a registry key that already has subkeys or values."},

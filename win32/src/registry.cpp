@@ -129,8 +129,7 @@ LONG setValue(Registry& r, HKEY handle, const WCHAR* name, DWORD type, const BYT
     if (label.size() > MaxValueNameLength) return ERROR_INVALID_PARAMETER;
     if (data) size = storedSize(type, data, size);
     auto found = at.key->values.find(RawName{label});
-    if (found == at.key->values.end())
-        found = at.key->values.emplace(fold(label), Value()).first;
+    if (found == at.key->values.end()) found = at.key->values.emplace(fold(label), Value()).first;
     Value& value = found->second;
     value.type = type;
     value.data.clear();
@@ -149,8 +148,7 @@ void terminate(const Value& value, BYTE* data, DWORD capacity) {
     data[n] = data[n + 1] = 0;
 }
 
-LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* type, BYTE* data,
-                DWORD* size) {
+LONG queryValue(Registry& r, HKEY handle, const WCHAR* name, DWORD* type, BYTE* data, DWORD* size) {
     Bound at;
     if (LONG code = bindFor(r, handle, KEY_QUERY_VALUE, at)) return code;
     auto it = at.key->values.find(RawName{valueName(name)});
@@ -226,24 +224,22 @@ LSTATUS WINAPI RegCreateKeyExW(HKEY hKey, LPCWSTR lpSubKey, DWORD Reserved, LPWS
                  });
 }
 
-LSTATUS WINAPI RegQueryValueExW(HKEY hKey, LPCWSTR lpValueName, LPDWORD lpReserved,
-                                LPDWORD lpType, LPBYTE lpData, LPDWORD lpcbData) {
-    return serve("RegQueryValueExW",
-                 {arg(hKey), arg(lpValueName), arg(lpReserved), arg(lpType), arg(lpData),
-                  arg(lpcbData)},
-                 nullptr, [&](Registry& r) {
-                     return queryValue(r, hKey, lpValueName, lpType, lpData, lpcbData);
-                 });
+LSTATUS WINAPI RegQueryValueExW(HKEY hKey, LPCWSTR lpValueName, LPDWORD lpReserved, LPDWORD lpType,
+                                LPBYTE lpData, LPDWORD lpcbData) {
+    return serve(
+        "RegQueryValueExW",
+        {arg(hKey), arg(lpValueName), arg(lpReserved), arg(lpType), arg(lpData), arg(lpcbData)},
+        nullptr,
+        [&](Registry& r) { return queryValue(r, hKey, lpValueName, lpType, lpData, lpcbData); });
 }
 
 // Reserved is ignored: Windows stores the value with Reserved 1 too.
 LSTATUS WINAPI RegSetValueExW(HKEY hKey, LPCWSTR lpValueName, DWORD Reserved, DWORD dwType,
                               const BYTE* lpData, DWORD cbData) {
-    return serve("RegSetValueExW",
-                 {arg(hKey), arg(lpValueName), Reserved, dwType, arg(lpData), cbData}, nullptr,
-                 [&](Registry& r) {
-                     return setValue(r, hKey, lpValueName, dwType, lpData, cbData);
-                 });
+    return serve(
+        "RegSetValueExW", {arg(hKey), arg(lpValueName), Reserved, dwType, arg(lpData), cbData},
+        nullptr,
+        [&](Registry& r) { return setValue(r, hKey, lpValueName, dwType, lpData, cbData); });
 }
 
 // No view flag: the process's default view, the 32-bit one.

@@ -59,7 +59,7 @@ using KeyRef = std::shared_ptr<Key>;
 using Children = std::map<std::u16string, KeyRef, FoldedOrder>;  // by folded name
 
 struct Key : std::enable_shared_from_this<Key> {
-    std::u16string name;  // first creator's spelling
+    std::u16string name;    // first creator's spelling
     Key* parent = nullptr;  // null for a root and for a deleted key
     unsigned root = 0;
     unsigned depth = 0;  // levels below the root

@@ -17,7 +17,9 @@ constexpr WORD StringsPerBlock = 16;
 size_t padToDword(size_t offset) { return (4 - offset % 4) % 4; }
 
 // Whether a TYPE or NAME field is the number `number`.
-bool isNumber(const w32::TemplateId& id, WORD number) { return id.isOrdinal && id.ordinal == number; }
+bool isNumber(const w32::TemplateId& id, WORD number) {
+    return id.isOrdinal && id.ordinal == number;
+}
 
 // Whether a record is the empty one that opens every 32-bit image.
 bool isLeadingRecord(const w32::ResourceRecord& record) {

@@ -64,8 +64,7 @@ W32_INTERNAL ResourceStatus lookupResource(const BYTE* image, size_t imageSize, 
 
 // String `index` (0-15) of a string-table block: its text, not terminated, and its length.
 // Entries that would run past the block's end count as absent (length 0).
-W32_INTERNAL const BYTE* blockString(const BYTE* block, size_t size, unsigned index,
-                                     WORD* length);
+W32_INTERNAL const BYTE* blockString(const BYTE* block, size_t size, unsigned index, WORD* length);
 
 // Finds a numbered resource of a loaded library as FindResourceW would; on failure sets the last
 // error to the reason (1812, 1813 or 1814) and returns false.

@@ -100,7 +100,8 @@ LRESULT listBoxMessage(Window& w, UINT message, WPARAM wParam, LPARAM lParam) {
         case LB_GETCURSEL: return w.selection;
         case LB_GETCOUNT: return count;
         case LB_GETTEXTLEN:
-            return index >= 0 && index < count ? static_cast<LRESULT>(w.items[index].size()) : LB_ERR;
+            return index >= 0 && index < count ? static_cast<LRESULT>(w.items[index].size())
+                                               : LB_ERR;
         case LB_GETTEXT: {
             if (index < 0 || index >= count || !lParam) return LB_ERR;
             // Like Windows, the caller's buffer is taken to be large enough (LB_GETTEXTLEN + 1).

@@ -16,9 +16,9 @@ struct MenuEntry {
     enum class Kind { Separator, Command, Popup };
     Kind kind = Kind::Command;
     std::u16string text;
-    uint32_t id = 0;                // Command: the command identifier
-    uint32_t state = 0;             // Command: the state flags GetMenuState reports
-    std::vector<MenuEntry> items;   // Popup: its items
+    uint32_t id = 0;               // Command: the command identifier
+    uint32_t state = 0;            // Command: the state flags GetMenuState reports
+    std::vector<MenuEntry> items;  // Popup: its items
 };
 
 // One event's entry, as the Infos entry point gives it, with the two words before it.

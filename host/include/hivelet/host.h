@@ -51,15 +51,15 @@ struct Param {
 
 // What an event gave back, and what the host saw while it ran.
 struct Outcome {
-    Slot raw = 0;                   // the routine's result slot, unconverted
-    bool isText = false;            // StringResultFlag was set by the routine
-    std::u16string text;            // the text at `raw` when isText
+    Slot raw = 0;         // the routine's result slot, unconverted
+    bool isText = false;  // StringResultFlag was set by the routine
+    std::u16string text;  // the text at `raw` when isText
     const void* textAddress = nullptr;
-    unsigned parameterFetches = 0;  // GetNextParameter calls
-    unsigned expressionFetches = 0; // GetFirstExpressionParameter + GetNextExpressionParameter
+    unsigned parameterFetches = 0;       // GetNextParameter calls
+    unsigned expressionFetches = 0;      // GetFirstExpressionParameter + GetNextExpressionParameter
     std::vector<size_t> bufferRequests;  // sizes asked of GetStringBuffer, in bytes
-    bool sentinelsIntact = true;    // nothing written past a lent buffer or the record
-    std::string damage;             // which sentinel was hit, when one was
+    bool sentinelsIntact = true;         // nothing written past a lent buffer or the record
+    std::string damage;                  // which sentinel was hit, when one was
     // Misuse of the host's services seen during the event (wrong constant arguments, more
     // fetches than parameters, a foreign record address, an unterminated text result ...).
     std::vector<std::string> violations;
@@ -187,7 +187,7 @@ public:
         std::vector<char16_t> buffer;  // all 256 characters as the module left them
         bool written = false;          // some character changed
         bool sentinelsIntact = true;
-        std::u16string text() const;   // up to the first zero, or all 256 without one
+        std::u16string text() const;  // up to the first zero, or all 256 without one
     };
     DebugLine debugLine(int item);
     static constexpr size_t DebugLineChars = 256;
