@@ -1,5 +1,6 @@
 // Feeds arbitrary bytes to the layer's menu-template reader, then walks whatever menu it built
 // the way the module copies its event menus, and destroys it.
+#include <w32/testctl.h>
 #include <windows.h>
 
 #include <stddef.h>

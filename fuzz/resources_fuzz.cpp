@@ -1,5 +1,6 @@
 // Feeds arbitrary bytes to the reader of compiled resource images, as the layer finds them in a
 // loaded library: record walk, lookups by type and name, string-table blocks.
+#include <w32/testctl.h>
 #include <windows.h>
 
 #include <stddef.h>
